@@ -1,0 +1,34 @@
+# quorix_add_test(NAME SOURCES... [LIBRARIES ...] [ARGUMENTS ...] [TIMEOUT s] [NAMESPACE])
+#
+# One GoogleTest binary and its entry in CTest. With NAMESPACE the test runs in a network namespace
+# of its own, where port 803 is free and may be bound; it is skipped (code 77) only where the kernel
+# forbids namespaces.
+function(quorix_add_test name)
+    cmake_parse_arguments(arg "NAMESPACE" "TIMEOUT" "SOURCES;LIBRARIES;ARGUMENTS;LABELS" ${ARGN})
+
+    add_executable(${name} ${arg_SOURCES})
+    target_link_libraries(${name} PRIVATE ${arg_LIBRARIES} Quorix::options GTest::gmock_main)
+    target_include_directories(${name} PRIVATE ${PROJECT_SOURCE_DIR}/tests)
+
+    set(launcher "")
+    if(arg_NAMESPACE)
+        set(launcher ${PROJECT_SOURCE_DIR}/tests/support/in-network-namespace)
+    endif()
+    add_test(NAME ${name} COMMAND ${launcher} $<TARGET_FILE:${name}> ${arg_ARGUMENTS})
+    if(NOT arg_TIMEOUT)
+        set(arg_TIMEOUT 120)
+    endif()
+    set_tests_properties(${name} PROPERTIES TIMEOUT ${arg_TIMEOUT} SKIP_RETURN_CODE 77
+        ENVIRONMENT "${QUORIX_TEST_ENVIRONMENT}")
+    if(arg_LABELS)
+        set_tests_properties(${name} PROPERTIES LABELS "${arg_LABELS}")
+    endif()
+endfunction()
+
+# A race report, an overflow or a leak fails the test that met it. The second thread sanitizer option
+# lets a process that only dies with a report be told from one that fails by itself.
+set(QUORIX_TEST_ENVIRONMENT
+    "ASAN_OPTIONS=detect_leaks=1:detect_stack_use_after_return=1"
+    "UBSAN_OPTIONS=print_stacktrace=1"
+    "TSAN_OPTIONS=suppressions=${PROJECT_SOURCE_DIR}/tests/support/tsan.supp:exitcode=66"
+)
