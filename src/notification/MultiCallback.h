@@ -1,0 +1,120 @@
+#pragma once
+
+#include "notification/GuardedCall.h"
+#include "notification/IMultiCallback.h"
+#include "utils/Mutex.h"
+
+#include <algorithm>
+#include <cstdint>
+#include <memory>
+#include <utility>
+#include <vector>
+
+namespace NotificationSystem {
+
+template <typename Sig>
+class VMultiCallback;
+
+template <typename Sig>
+class VMultiCallbackPostal;
+
+/// A list of functions that is called in order of adding, on the caller's thread. A function goes
+/// by itself at the first call after its weak target has gone.
+///
+/// Threads: every operation [any]. The mutex guards the list only: functions are called, copied and
+/// destroyed without it, since each of these may come back here. A call runs the list as it stood
+/// when the call began.
+/// Failure: an exception of a function passes to whoever called, and those after it do not run.
+template <typename R, typename... Args>
+class VMultiCallback<R(Args...)> : public KVR::IMultiCallback<R(Args...)>
+{
+public:
+    typedef R Sig(Args...);
+
+    VMultiCallback() = default;
+    VMultiCallback(const VMultiCallback&) = delete;
+    VMultiCallback& operator=(const VMultiCallback&) = delete;
+
+    std::uint64_t Add(boost::function<Sig> function) override
+    {
+        return Append(std::make_shared<VStored>(std::move(function)));
+    }
+
+    std::size_t Remove(std::uint64_t handle) override { return Take(handle) ? 1 : 0; }
+
+    std::size_t Clear() override { return TakeAll().size(); }
+
+    std::size_t Count() const override
+    {
+        KVR::VMutexLock lock(mutex);
+        return entries.size();
+    }
+
+    /// Calls every function. @return whether at least one of them had a live target
+    bool operator()(Args... arguments)
+    {
+        const std::vector<VEntry> called = Entries(); // keeps the handles of removed ones unused
+        std::vector<std::uint64_t> dead;
+        for (const VEntry& entry : called) {
+            if (!KVR::GuardedCall(*entry, arguments...)) {
+                dead.push_back(HandleOf(entry));
+            }
+        }
+        for (const std::uint64_t handle : dead) {
+            Remove(handle);
+        }
+        return dead.size() < called.size();
+    }
+
+private:
+    friend class VMultiCallbackPostal<Sig>;
+
+    typedef boost::function<Sig> VStored;
+    typedef std::shared_ptr<VStored> VEntry;
+
+    static std::uint64_t HandleOf(const VEntry& entry)
+    {
+        return reinterpret_cast<std::uintptr_t>(entry.get());
+    }
+
+    std::vector<VEntry> Entries() const
+    {
+        KVR::VMutexLock lock(mutex);
+        return entries;
+    }
+
+    std::uint64_t Append(VEntry entry)
+    {
+        const std::uint64_t handle = HandleOf(entry);
+        KVR::VMutexLock lock(mutex);
+        entries.push_back(std::move(entry));
+        return handle;
+    }
+
+    /// @return the entry taken out, or null; the caller lets go of it once it holds no lock
+    VEntry Take(std::uint64_t handle)
+    {
+        KVR::VMutexLock lock(mutex);
+        const auto found =
+            std::find_if(entries.begin(), entries.end(),
+                         [handle](const VEntry& entry) { return HandleOf(entry) == handle; });
+        if (found == entries.end()) {
+            return nullptr;
+        }
+        VEntry taken = std::move(*found);
+        entries.erase(found);
+        return taken;
+    }
+
+    /// @return all entries, which the caller lets go of once it holds no lock
+    std::vector<VEntry> TakeAll()
+    {
+        KVR::VMutexLock lock(mutex);
+        return std::exchange(entries, {});
+    }
+
+    mutable KVR::VMutex mutex;
+    std::vector<VEntry> entries KVR_GUARDED_BY(mutex); // in order of adding
+};
+
+} // namespace NotificationSystem
