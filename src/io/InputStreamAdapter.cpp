@@ -1,0 +1,7 @@
+#include "io/InputStreamAdapter.h"
+
+namespace KVR {
+
+template class IInputStreamAdapter<IO::Detail::VVectorReader>;
+
+} // namespace KVR
