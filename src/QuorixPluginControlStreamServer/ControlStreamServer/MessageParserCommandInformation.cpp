@@ -1,0 +1,62 @@
+#include "QuorixPluginControlStreamServer/ControlStreamServer/MessageParserCommandInformation.h"
+
+#include "QuorixPluginControlStreamServer/ControlStreamServer/IClientConnection.h"
+#include "QuorixPluginControlStreamServer/ControlStreamServer/ReplyDocument.h"
+#include "QuorixPluginControlStreamServer/ControlSystem/IControlSystem.h"
+
+#include <utility>
+#include <vector>
+
+namespace ControlStreamServer {
+
+namespace {
+
+void AddDescriptions(VReplyDocument& reply, VReplyDocument::VElement& parent,
+                     std::wstring_view listName,
+                     const std::vector<ControlSystem::IParameterInformation>& parameters)
+{
+    VReplyDocument::VElement& list = reply.AddElement(parent, listName);
+    for (const ControlSystem::IParameterInformation& parameter : parameters) {
+        // Deliberate: what stands under Value is the description, a text for people. Devices know
+        // it by that name here, and by its own in the information of an event.
+        reply.AddParameter(list, parameter.Name, L"Value", parameter.Description);
+    }
+}
+
+std::wstring BuildReply(const std::wstring& correlation,
+                        const ControlSystem::ICommandInformation& information)
+{
+    VReplyDocument reply;
+    VReplyDocument::VElement& root = reply.AddElement(reply.Top(), L"CommandInformation");
+    reply.AddElement(root, L"Correlation", correlation);
+    reply.AddElement(root, L"Name", information.Name);
+    reply.AddElement(root, L"Description", information.Description);
+    AddDescriptions(reply, root, L"InputParameters", information.InputParameters);
+    AddDescriptions(reply, root, L"ReplyParameters", information.ReplyParameters);
+    return reply.Print();
+}
+
+} // namespace
+
+VMessageParserCommandInformation::VMessageParserCommandInformation(
+    std::shared_ptr<IControlSystem> controlSystem)
+    : VMessageParser(L"CommandInformation"), controlSystem(std::move(controlSystem))
+{
+}
+
+bool VMessageParserCommandInformation::Answer(const std::shared_ptr<IClientConnection>& connection,
+                                              const VElement& root)
+{
+    const std::wstring correlation = ChildValue(root, L"Correlation");
+    if (correlation.empty()) {
+        return false;
+    }
+    const std::wstring name = ChildValue(root, L"Name");
+    if (name.empty()) {
+        return false;
+    }
+    connection->Send(BuildReply(correlation, controlSystem->GetCommandInformation(name)));
+    return true;
+}
+
+} // namespace ControlStreamServer

@@ -1,0 +1,45 @@
+#include "QuorixPluginControlStreamServer/ControlStreamServer/MessageParserEventInformation.h"
+
+#include "QuorixPluginControlStreamServer/ControlStreamServer/IClientConnection.h"
+#include "QuorixPluginControlStreamServer/ControlStreamServer/ReplyDocument.h"
+#include "QuorixPluginControlStreamServer/ControlSystem/IControlSystem.h"
+
+#include <utility>
+
+namespace ControlStreamServer {
+
+namespace {
+
+std::wstring BuildReply(const ControlSystem::IEventInformation& information)
+{
+    VReplyDocument reply;
+    VReplyDocument::VElement& root = reply.AddElement(reply.Top(), L"EventInformation");
+    reply.AddElement(root, L"Name", information.Name);
+    reply.AddElement(root, L"Description", information.Description);
+    VReplyDocument::VElement& parameters = reply.AddElement(root, L"Parameters");
+    for (const ControlSystem::IParameterInformation& parameter : information.Parameters) {
+        reply.AddParameter(parameters, parameter.Name, L"Description", parameter.Description);
+    }
+    return reply.Print();
+}
+
+} // namespace
+
+VMessageParserEventInformation::VMessageParserEventInformation(
+    std::shared_ptr<IControlSystem> controlSystem)
+    : VMessageParser(L"EventInformation"), controlSystem(std::move(controlSystem))
+{
+}
+
+bool VMessageParserEventInformation::Answer(const std::shared_ptr<IClientConnection>& connection,
+                                            const VElement& root)
+{
+    const std::wstring name = ValueOf(root);
+    if (name.empty()) {
+        return false;
+    }
+    connection->Send(BuildReply(controlSystem->GetEventInformation(name)));
+    return true;
+}
+
+} // namespace ControlStreamServer

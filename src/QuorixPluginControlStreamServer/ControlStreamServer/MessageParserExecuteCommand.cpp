@@ -1,0 +1,116 @@
+#include "QuorixPluginControlStreamServer/ControlStreamServer/MessageParserExecuteCommand.h"
+
+#include "QuorixPluginControlStreamServer/ControlStreamServer/IClientConnection.h"
+#include "QuorixPluginControlStreamServer/ControlStreamServer/ReplyDocument.h"
+#include "QuorixPluginControlStreamServer/ControlStreamServer/ResultText.h"
+#include "QuorixPluginControlStreamServer/ControlSystem/IControlSystem.h"
+
+#include <boost/algorithm/string/replace.hpp>
+#include <boost/bind/bind.hpp>
+
+#include <utility>
+
+namespace ControlStreamServer {
+
+namespace {
+
+constexpr std::int32_t Success = 1;
+
+/// What a reply needs, shared by the two functions of which the dispatcher calls one.
+struct VRequest
+{
+    std::shared_ptr<IClientConnection> Connection;
+    std::wstring Name;
+    std::wstring Correlation;
+};
+
+std::wstring BuildReply(const VRequest& request, std::int32_t code,
+                        const ControlSystem::IParameters& parameters)
+{
+    VReplyDocument reply;
+    VReplyDocument::VElement& root = reply.AddElement(reply.Top(), L"CommandReply");
+    reply.AddElement(root, L"Name", request.Name);
+    reply.AddElement(root, L"Correlation", request.Correlation);
+    reply.AddElement(root, L"Result", ResultText(code));
+    reply.AddParameters(root, parameters);
+    return reply.Print();
+}
+
+void SendSuccess(const std::shared_ptr<const VRequest>& request,
+                 const ControlSystem::IParameters& parameters)
+{
+    request->Connection->Send(BuildReply(*request, Success, parameters));
+}
+
+void SendFailure(const std::shared_ptr<const VRequest>& request, ControlSystem::IResult result)
+{
+    request->Connection->Send(BuildReply(*request, result.Code, ControlSystem::IParameters()));
+}
+
+/// Decodes the five entities. The ampersand comes last, so that "&amp;lt;" ends up as "&lt;".
+void DecodeEntities(std::wstring& value)
+{
+    if (value.find(L'&') == std::wstring::npos) {
+        return;
+    }
+    boost::algorithm::replace_all(value, L"&quot;", L"\"");
+    boost::algorithm::replace_all(value, L"&apos;", L"'");
+    boost::algorithm::replace_all(value, L"&lt;", L"<");
+    boost::algorithm::replace_all(value, L"&gt;", L">");
+    boost::algorithm::replace_all(value, L"&amp;", L"&");
+}
+
+} // namespace
+
+VMessageParserExecuteCommand::VMessageParserExecuteCommand(
+    std::shared_ptr<IControlSystem> controlSystem)
+    : VMessageParser(L"ExecuteCommand"), controlSystem(std::move(controlSystem))
+{
+}
+
+bool VMessageParserExecuteCommand::Answer(const std::shared_ptr<IClientConnection>& connection,
+                                          const VElement& root)
+{
+    const auto request = std::make_shared<VRequest>();
+    request->Connection = connection;
+    request->Name = ChildValue(root, L"Name");
+    if (request->Name.empty()) {
+        return false;
+    }
+    request->Correlation = ChildValue(root, L"Correlation");
+    if (request->Correlation.empty()) {
+        return false;
+    }
+    ControlSystem::IParameters parameters;
+    if (!ReadParameters(root, parameters)) {
+        return false;
+    }
+
+    const std::shared_ptr<const VRequest> answered = request;
+    controlSystem->ExecuteCommand(request->Name, parameters,
+                                  boost::bind(&SendSuccess, answered, boost::placeholders::_1),
+                                  boost::bind(&SendFailure, answered, boost::placeholders::_1));
+    return true;
+}
+
+bool VMessageParserExecuteCommand::ReadParameters(const VElement& root,
+                                                  ControlSystem::IParameters& parameters)
+{
+    const VElement* list = FindChild(root, L"Parameters");
+    const VElement* parameter = list != nullptr ? FindChild(*list, L"Parameter") : nullptr;
+    // Deliberate: only the first is looked for by its name. From there on every sibling counts as a
+    // parameter, whatever it is, and one without a name spoils the whole message.
+    for (; parameter != nullptr; parameter = parameter->next_sibling()) {
+        const std::wstring name = ChildValue(*parameter, L"Name");
+        if (name.empty()) {
+            return false;
+        }
+        std::wstring value = ChildValue(*parameter, L"Value");
+        // Deliberate: the value alone is decoded, also where the XML parser has decoded it before.
+        DecodeEntities(value);
+        parameters.Set(name, value);
+    }
+    return true;
+}
+
+} // namespace ControlStreamServer

@@ -1,0 +1,497 @@
+#include "QuorixPluginControlStreamServer/ControlSystem/ICommandProvider.h"
+#include "QuorixPluginControlStreamServer/ControlSystem/IEventProvider.h"
+#include "QuorixPluginInterface/IHost.h"
+#include "QuorixPluginInterface/IPlugin.h"
+#include "QuorixPluginInterface/IQuorixGUI.h"
+#include "io/Values.h"
+#include "support/FakeCameras.h"
+#include "support/FakeControlSystem.h"
+#include "support/RawClient.h"
+#include "support/TestListener.h"
+
+#include <boost/system/system_error.hpp>
+#include <gmock/gmock.h>
+
+#include <chrono>
+#include <cstdio>
+#include <cstring>
+#include <dlfcn.h>
+#include <filesystem>
+#include <memory>
+#include <string>
+#include <sys/resource.h>
+#include <system_error>
+#include <thread>
+#include <utility>
+#include <vector>
+
+// The plug-in as a host meets it: the built library, its two functions, and the real port.
+
+using QuorixPluginInterface::IPlugin;
+using testing::ElementsAre;
+using testing::IsEmpty;
+using testing::UnorderedElementsAre;
+using TestSupport::VFakeControlSystem;
+using TestSupport::VRawClient;
+
+namespace {
+
+constexpr std::uint16_t port = 803;
+
+const char* const serverInformation =
+    R"(<?xml version="1.0" encoding="UTF-16" standalone="no"?>)"
+    R"(<ServerInformation><StreamVersion major="1" minor="0"/></ServerInformation>)";
+
+/// The library, loaded as a host does.
+class VLibrary
+{
+public:
+    VLibrary() : handle(dlopen(QUORIX_PLUGIN_LIBRARY, RTLD_NOW | RTLD_LOCAL))
+    {
+        if (handle == nullptr) {
+            throw std::runtime_error(dlerror());
+        }
+    }
+
+    IPlugin* Create() const { return Find<IPlugin* (*)()>("CreatePlugin")(); }
+    void Destroy(IPlugin* plugin) const { Find<void (*)(IPlugin*)>("DestroyPlugin")(plugin); }
+
+    /// Closes the handle. @return whether the library is still in memory
+    bool StaysWhenClosed()
+    {
+        dlclose(handle);
+        handle = dlopen(QUORIX_PLUGIN_LIBRARY, RTLD_NOW | RTLD_LOCAL | RTLD_NOLOAD);
+        return handle != nullptr;
+    }
+
+private:
+    template <typename TFunction>
+    TFunction Find(const char* name) const
+    {
+        void* const address = dlsym(handle, name);
+        if (address == nullptr) {
+            throw std::runtime_error(dlerror());
+        }
+        TFunction function = nullptr;
+        std::memcpy(&function, &address, sizeof function);
+        return function;
+    }
+
+    void* handle;
+};
+
+/// A host that supplies what a test gives it.
+class VFakeHost : public QuorixPluginInterface::IHost
+{
+public:
+    explicit VFakeHost(std::shared_ptr<IControlSystem> controlSystem)
+        : controlSystem(std::move(controlSystem))
+    {
+    }
+
+    std::shared_ptr<TestSupport::VFakeCameraSettings> Settings;
+    std::shared_ptr<TestSupport::VFakeCameraSelection> Selection;
+
+    std::shared_ptr<IDataStore> GetStore() override { return nullptr; }
+    std::shared_ptr<ICameraSettingsSource> GetCameraSettingsSource() override { return Settings; }
+    std::shared_ptr<KVR::IPostalService> GetPostalService() override { return nullptr; }
+    std::shared_ptr<ICameraSelectionSource> GetCameraSelectionSource() override
+    {
+        return Selection;
+    }
+    std::shared_ptr<IControlSystem> GetControlSystem() override { return controlSystem; }
+
+private:
+    const std::shared_ptr<IControlSystem> controlSystem;
+};
+
+class VFakeGUI : public IQuorixGUI
+{
+public:
+    std::shared_ptr<VQuickWidgetManager> GetQuickContext() override { return nullptr; }
+    std::shared_ptr<IMenuService> GetMenuService() override { return nullptr; }
+    std::shared_ptr<IPanelService> GetPanelService() override { return nullptr; }
+};
+
+bool CanConnect()
+{
+    try {
+        const VRawClient client(port);
+        return true;
+    } catch (const std::system_error&) {
+        return false;
+    }
+}
+
+/// Waits for what the socket's thread brings about by itself.
+template <typename TCondition>
+bool ComesTrue(TCondition condition)
+{
+    const auto deadline = std::chrono::steady_clock::now() + std::chrono::seconds(60);
+    while (!condition()) {
+        if (std::chrono::steady_clock::now() > deadline) {
+            return false;
+        }
+        std::this_thread::yield();
+    }
+    return true;
+}
+
+/// A plug-in object with a host whose dispatcher knows one command.
+class Plugin : public testing::Test
+{
+protected:
+    Plugin()
+    {
+        controlSystem->CommandNames = {L"Test.Echo"};
+        controlSystem->Commands[L"Test.Echo"] = &VFakeControlSystem::Echo;
+    }
+    ~Plugin() override { Destroy(); }
+
+    /// Destroys the plug-in. A message that the socket's thread has answered, but not yet left,
+    /// holds the server until it has: the port is closed by that thread then, a moment later.
+    void Destroy()
+    {
+        library.Destroy(std::exchange(plugin, nullptr));
+        EXPECT_TRUE(ComesTrue([] { return !CanConnect(); }));
+    }
+
+    VLibrary library;
+    const std::shared_ptr<VFakeControlSystem> controlSystem =
+        std::make_shared<VFakeControlSystem>();
+    VFakeHost host{controlSystem};
+    VFakeHost hostWithoutServices{nullptr};
+    IPlugin* plugin = library.Create();
+};
+
+/// Returns the place of a virtual operation in the table that the host calls by.
+template <typename TOperation>
+std::size_t SlotOf(TOperation operation)
+{
+    std::size_t word = 0; // one more than the offset in the table
+    static_assert(sizeof operation == 2 * sizeof word, "a pointer to a member, as this ABI has it");
+    std::memcpy(&word, &operation, sizeof word);
+    return (word - 1) / sizeof(void*);
+}
+
+} // namespace
+
+TEST(PluginLibrary, ExportsItsTwoFunctionsAndNothingElse)
+{
+    FILE* const table = popen("nm -D --defined-only " QUORIX_PLUGIN_LIBRARY, "r");
+    ASSERT_NE(nullptr, table);
+    std::vector<std::string> names;
+    char address[64] = {}, kind[8] = {}, name[1024] = {};
+    while (fscanf(table, "%63s %7s %1023s", address, kind, name) == 3) {
+        names.push_back(std::string(kind) + " " + name);
+    }
+    ASSERT_EQ(0, pclose(table));
+
+    EXPECT_THAT(names, UnorderedElementsAre("T CreatePlugin", "T DestroyPlugin"));
+}
+
+TEST(PluginLibrary, StaysInMemory)
+{
+    VLibrary library;
+
+    EXPECT_TRUE(library.StaysWhenClosed());
+}
+
+TEST(PluginLibrary, DestroyIgnoresNull)
+{
+    VLibrary().Destroy(nullptr);
+}
+
+TEST(PluginInterface, KeepsTheOrderOfItsSlots)
+{
+    // The destructor takes the first two.
+    EXPECT_EQ(2U, SlotOf(&IPlugin::FirstTextQuery));
+    EXPECT_EQ(3U, SlotOf(&IPlugin::SecondTextQuery));
+    EXPECT_EQ(4U, SlotOf(&IPlugin::FirstQuery));
+    EXPECT_EQ(5U, SlotOf(&IPlugin::SecondQuery));
+    EXPECT_EQ(6U, SlotOf(&IPlugin::ThirdQuery));
+    EXPECT_EQ(7U, SlotOf(&IPlugin::FourthQuery));
+    EXPECT_EQ(8U, SlotOf(&IPlugin::Start));
+    EXPECT_EQ(9U, SlotOf(&IPlugin::InitialiseGUI));
+    EXPECT_EQ(10U, SlotOf(&IPlugin::Stop));
+    EXPECT_EQ(11U, SlotOf(&IPlugin::GetInterfaceVersion));
+}
+
+TEST_F(Plugin, AnswersTheHostsQueriesWithTheDefaults)
+{
+    EXPECT_EQ("", plugin->FirstTextQuery());
+    EXPECT_EQ("", plugin->SecondTextQuery());
+    EXPECT_TRUE(plugin->FirstQuery());
+    EXPECT_TRUE(plugin->SecondQuery());
+    EXPECT_TRUE(plugin->ThirdQuery());
+    EXPECT_TRUE(plugin->FourthQuery());
+    EXPECT_EQ(108131, plugin->GetInterfaceVersion());
+}
+
+TEST_F(Plugin, MadeAndDestroyedItStartsNothing)
+{
+    EXPECT_FALSE(CanConnect());
+
+    Destroy();
+
+    EXPECT_EQ(0U, controlSystem->GetEventNotification().Count());
+}
+
+TEST_F(Plugin, StopBeforeStartDoesNothing)
+{
+    plugin->Stop();
+}
+
+TEST_F(Plugin, WithoutADispatcherItStartsWithoutASocket)
+{
+    EXPECT_TRUE(plugin->Start(hostWithoutServices));
+
+    EXPECT_FALSE(CanConnect());
+    plugin->Stop();
+    Destroy();
+}
+
+TEST_F(Plugin, StartedItServesDevices)
+{
+    EXPECT_TRUE(plugin->Start(host));
+
+    VRawClient device(port);
+    EXPECT_EQ(serverInformation, device.Request("<ServerInformation/>"));
+    EXPECT_EQ(1U, controlSystem->GetEventNotification().Count());
+}
+
+TEST_F(Plugin, RegistersTheCameraProvidersInOrderAndStopTakesThemBack)
+{
+    plugin->Start(host);
+
+    ASSERT_EQ(1U, controlSystem->CommandProviders().size());
+    std::vector<std::wstring> commands;
+    controlSystem->CommandProviders()[0]->GetCommandNames(commands);
+    EXPECT_EQ(14U, commands.size());
+    EXPECT_EQ(L"CameraSettings_EnableStrobes", commands.front());
+    std::vector<std::wstring> events;
+    for (const auto& provider : controlSystem->EventProviders()) {
+        provider->GetEventNames(events);
+    }
+    EXPECT_THAT(events,
+                ElementsAre(L"Event.Cameras.SelectionChanged", L"Event.Cameras.NameChanged",
+                            L"Event.Cameras.UserIdChanged", L"Event.Cameras.GreyscaleModeChanged",
+                            L"Event.Cameras.SettingChanged", L"Event.Cameras.TapToSelectChanged"));
+
+    plugin->Stop();
+
+    EXPECT_THAT(controlSystem->CommandProviders(), IsEmpty());
+    EXPECT_THAT(controlSystem->EventProviders(), IsEmpty());
+}
+
+TEST_F(Plugin, ItsCommandsReachTheHostsTwoCameraSources)
+{
+    host.Settings = std::make_shared<TestSupport::VFakeCameraSettings>();
+    host.Selection = std::make_shared<TestSupport::VFakeCameraSelection>();
+    host.Settings->Add("Device", "qx:7").Add("StrobeIntensity", MakeDoubleValue(0.5));
+    host.Selection->View->Selected = {VSelectionEntry("qx:3")};
+    plugin->Start(host);
+    const auto provider = controlSystem->CommandProviders().at(0);
+
+    ControlSystem::IParameters input, strobe, selection;
+    input.Set(L"Param_CameraDeviceId", L"7");
+    provider->ExecuteCommand(L"CameraSettings_GetStrobeIntensity", input, strobe);
+    provider->ExecuteCommand(L"CameraSettings_GetSelection", input, selection);
+
+    EXPECT_EQ(L"0.5", strobe.Get(L"Param_StrobeIntensity"));
+    EXPECT_EQ(L"3", selection.Get(L"Param_CameraSelection"));
+}
+
+TEST_F(Plugin, ChangesInTheHostsTwoCameraSourcesBecomeEventsUntilItIsDestroyed)
+{
+    host.Settings = std::make_shared<TestSupport::VFakeCameraSettings>();
+    host.Selection = std::make_shared<TestSupport::VFakeCameraSelection>();
+    auto& strobe =
+        host.Settings->Add("Device", "qx:7").Add("StrobeIntensity", MakeDoubleValue(0.5));
+    host.Selection->View->Selected = {VSelectionEntry("qx:3")};
+    plugin->Start(host);
+    host.Settings->DeviceAdded("Device", "qx:7");
+    VRawClient device(port);
+    device.Request("<ServerInformation/>");
+
+    strobe.Changed();
+    host.Selection->Changed();
+
+    const std::string begin = R"(<?xml version="1.0" encoding="UTF-16" standalone="no"?>)"
+                              "<Event><Name>Event.Cameras.";
+    EXPECT_EQ(begin + "SettingChanged</Name><Parameters>"
+                      "<Parameter><Name>CameraId</Name><Value>7</Value></Parameter>"
+                      "<Parameter><Name>SettingName</Name><Value>StrobeIntensity</Value>"
+                      "</Parameter><Parameter><Name>SettingValue</Name><Value>0.5</Value>"
+                      "</Parameter></Parameters></Event>",
+              device.ReadFrame());
+    EXPECT_EQ(begin + "SelectionChanged</Name><Parameters><Parameter>"
+                      "<Name>SelectedCameraIds</Name><Value>3</Value></Parameter></Parameters>"
+                      "</Event>",
+              device.ReadFrame());
+
+    plugin->Stop();
+    Destroy();
+
+    strobe.Changed();
+    host.Selection->Changed();
+    EXPECT_EQ("", device.ReadToEnd());
+    EXPECT_EQ(0U, strobe.Changed.Count());
+    EXPECT_EQ(0U, host.Selection->Changed.Count());
+}
+
+TEST_F(Plugin, WithNothingRegisteredItAnswersAndListsNothing)
+{
+    controlSystem->CommandNames.clear();
+    plugin->Start(host);
+
+    VRawClient device(port);
+
+    EXPECT_EQ(serverInformation, device.Request("<ServerInformation/>"));
+    EXPECT_EQ(R"(<?xml version="1.0" encoding="UTF-16" standalone="no"?>)"
+              "<Correlation>1</Correlation><Commands/>",
+              device.Request("<Commands><Correlation>1</Correlation></Commands>"));
+    EXPECT_EQ(R"(<?xml version="1.0" encoding="UTF-16" standalone="no"?><Events/>)",
+              device.Request("<Events/>"));
+}
+
+TEST_F(Plugin, RunsCommandsWithEntitiesLeftAsTheyStand)
+{
+    plugin->Start(host);
+    VRawClient device(port);
+
+    // The name keeps its entity, and so the reply prints the ampersand as one again.
+    EXPECT_EQ(R"(<?xml version="1.0" encoding="UTF-16" standalone="no"?>)"
+              "<CommandReply><Name>Test.Echo</Name><Correlation>a&amp;amp;b</Correlation>"
+              "<Result>OK</Result><Parameters><Parameter><Name>x</Name><Value>1</Value>"
+              "</Parameter></Parameters></CommandReply>",
+              device.Request("<ExecuteCommand><Name>Test.Echo</Name>"
+                             "<Correlation>a&amp;b</Correlation><Parameters><Parameter>"
+                             "<Name>x</Name><Value>1</Value></Parameter></Parameters>"
+                             "</ExecuteCommand>"));
+}
+
+TEST_F(Plugin, InitialiseGUIIsTrue)
+{
+    VFakeGUI gui;
+    plugin->Start(host);
+
+    EXPECT_TRUE(plugin->InitialiseGUI(host, gui));
+}
+
+TEST_F(Plugin, WithThePortTakenItStartsAndNoDeviceCanConnectToIt)
+{
+    TestSupport::VTestListener other(TestSupport::VTestListener::listening, port);
+
+    EXPECT_TRUE(plugin->Start(host));
+
+    VRawClient device(port); // reaches the other
+    close(other.Accept());
+    EXPECT_EQ("", device.ReadToEnd());
+    other.Close();
+    EXPECT_FALSE(CanConnect()); // also once the port is free
+    plugin->Stop();
+}
+
+TEST_F(Plugin, AfterStopDevicesStayAndOthersMayConnect)
+{
+    plugin->Start(host);
+    VRawClient before(port);
+    before.Request("<ServerInformation/>");
+
+    plugin->Stop();
+
+    VRawClient after(port);
+    EXPECT_EQ(serverInformation, before.Request("<ServerInformation/>"));
+    EXPECT_EQ(serverInformation, after.Request("<ServerInformation/>"));
+    controlSystem->FireEvent(L"Event.X", {});
+    const std::string event = R"(<?xml version="1.0" encoding="UTF-16" standalone="no"?>)"
+                              "<Event><Name>Event.X</Name><Parameters/></Event>";
+    EXPECT_EQ(event, before.ReadFrame());
+    EXPECT_EQ(event, after.ReadFrame());
+}
+
+TEST_F(Plugin, DestroyedItClosesEveryConnectionAndThePort)
+{
+    using namespace std::string_literals;
+    plugin->Start(host);
+    VRawClient idle(port);
+    VRawClient withinAHeader(port);
+    VRawClient withinAText(port);
+    withinAHeader.Send("\x20\x00"s);
+    withinAText.Send("\x20\x00\x00\x00<Serv"s);
+    idle.Request("<ServerInformation/>");
+
+    plugin->Stop();
+    Destroy(); // would hang if the socket waited for the pending reads
+
+    EXPECT_EQ("", idle.ReadToEnd());
+    EXPECT_EQ("", withinAHeader.ReadToEnd());
+    EXPECT_EQ("", withinAText.ReadToEnd());
+    EXPECT_EQ(0U, controlSystem->GetEventNotification().Count());
+    EXPECT_TRUE(ComesTrue([&] { return controlSystem.use_count() == 2; })); // the test and its host
+}
+
+TEST_F(Plugin, DestroyedWithoutStopItEndsAsWell)
+{
+    plugin->Start(host);
+    VRawClient device(port);
+    device.Request("<ServerInformation/>");
+
+    Destroy();
+
+    EXPECT_EQ("", device.ReadToEnd());
+}
+
+TEST_F(Plugin, StartsAgainAtOnceOnTheSamePort)
+{
+    for (int i = 0; i < 3; ++i) {
+        EXPECT_TRUE(plugin->Start(host));
+        VRawClient device(port);
+        EXPECT_EQ(serverInformation, device.Request("<ServerInformation/>"));
+
+        plugin->Stop();
+        Destroy(); // the host closes first, so its side of the connection lingers
+        plugin = library.Create();
+    }
+}
+
+TEST_F(Plugin, ASecondStartIsNotGuardedAndLosesThePort)
+{
+    plugin->Start(host);
+    VRawClient device(port);
+    device.Request("<ServerInformation/>");
+
+    EXPECT_TRUE(plugin->Start(host));
+
+    EXPECT_TRUE(ComesTrue([] { return !CanConnect(); }));
+    EXPECT_EQ("", device.ReadToEnd());
+    EXPECT_EQ(1U, controlSystem->GetEventNotification().Count());
+}
+
+TEST_F(Plugin, AnExceptionOutOfTheSocketLeavesStart)
+{
+    rlimit limit = {};
+    getrlimit(RLIMIT_NOFILE, &limit);
+    const rlimit before = limit;
+    const auto descriptors = std::filesystem::directory_iterator("/proc/self/fd");
+    const auto open = static_cast<rlim_t>(std::distance(begin(descriptors), end(descriptors)));
+
+    // With one descriptor more each time, each step of the socket fails in turn; the last one is
+    // its own, that of opening.
+    std::vector<std::string> failures;
+    bool started = false;
+    for (limit.rlim_cur = open; !started; ++limit.rlim_cur) {
+        setrlimit(RLIMIT_NOFILE, &limit);
+        try {
+            started = plugin->Start(host);
+        } catch (const boost::system::system_error& error) {
+            failures.push_back(error.what());
+        }
+    }
+    setrlimit(RLIMIT_NOFILE, &before);
+
+    ASSERT_THAT(failures, testing::Not(IsEmpty()));
+    EXPECT_EQ("open: Too many open files", failures.back());
+    EXPECT_TRUE(CanConnect());
+}
