@@ -1,0 +1,148 @@
+#include "HostApplication.h"
+
+#include "CameraCommands.h"
+#include "ConsoleCommands.h"
+#include "ConsoleStream.h"
+#include "ControlSystem.h"
+#include "FileLimit.h"
+#include "HostCommandProvider.h"
+#include "LeftThreads.h"
+#include "Plugin.h"
+#include "PortCheck.h"
+#include "QuorixPluginInterface/IPlugin.h"
+#include "StalledPeers.h"
+#include "cameras/SimulatedCameras.h"
+#include "utils/LogStatement.h"
+
+#include <QCoreApplication>
+
+#include <exception>
+#include <filesystem>
+#include <unistd.h>
+#include <utility>
+
+namespace QuorixHost {
+namespace {
+
+constexpr int startFailedExitCode = 1;
+
+// The control stream's port, which the plug-in fixes.
+constexpr std::uint16_t controlStreamPort = 803;
+
+// How long an orderly stop may take before the log says what holds it up.
+constexpr std::chrono::milliseconds stopPatience{5000};
+
+// How long a thread that the plug-in left behind may take to end. One that never ends is harmless.
+constexpr std::chrono::milliseconds leftThreadLimit{1000};
+
+/// Makes the folder given for the host's files. Throws std::runtime_error where it cannot be used.
+void PrepareDataFolder(const std::string& folder)
+{
+    std::error_code error;
+    std::filesystem::create_directories(folder, error);
+    if (error || !std::filesystem::is_directory(folder, error) ||
+        access(folder.c_str(), W_OK | X_OK) != 0) {
+        throw std::runtime_error("the data folder " + folder + " cannot be made or written to");
+    }
+}
+
+} // namespace
+
+VHostApplication::VHostApplication(VOptions options)
+    : options(std::move(options)),
+      quit(&QCoreApplication::quit),
+      orderlyStop([this] { quit.Wake(); }, [] { return DescribeStalledPeers(controlStreamPort); },
+                  stopPatience),
+      host(this->options.cameras)
+{
+}
+
+VHostApplication::~VHostApplication() = default;
+
+int VHostApplication::Run()
+{
+    const std::set<pid_t> ownThreads = OwnThreads();
+    RaiseFileLimit();
+    const bool started = StartPlugin();
+    if (started) {
+        Serve();
+        StopPlugin();
+    }
+    host.Close();
+    if (!AwaitEndOfOtherThreads(ownThreads, leftThreadLimit)) {
+        KVR_LOG("Host", 6, "The plug-in has left threads behind");
+    }
+    if (!started) {
+        return startFailedExitCode;
+    }
+    KVR_LOG("Host", 4, "Stopped");
+    return 0;
+}
+
+void VHostApplication::Serve()
+{
+    ReportPort();
+    if (options.console) {
+        OpenConsole();
+    }
+    QCoreApplication::exec();
+    consoleStream.reset();
+}
+
+bool VHostApplication::StartPlugin()
+{
+    try {
+        if (!options.dataFolder.empty()) {
+            PrepareDataFolder(options.dataFolder);
+        }
+        host.GetControlSystem()->AddCommandProvider(std::make_shared<VHostCommandProvider>(
+            [cameras = host.Cameras().cameras] { return cameras->CameraNumbers(); }));
+
+        const std::string path = options.plugin.empty() ? FindOwnPlugin() : options.plugin;
+        plugin = std::make_unique<VPlugin>(path);
+        KVR_LOG("Host", 4, "Loaded the plug-in %1%", path);
+        if ((*plugin)->Start(host)) {
+            // Only what is reported from now on is heard of by the plug-in.
+            host.Cameras().cameras->ReportDevices();
+            return true;
+        }
+        KVR_LOG("Host", 2, "The plug-in %1% did not start", path);
+    } catch (const std::exception& exception) {
+        KVR_LOG("Host", 2, "Cannot start: %1%", exception.what());
+    }
+    plugin.reset();
+    return false;
+}
+
+void VHostApplication::ReportPort() const
+{
+    const VPortFinding finding = CheckPort(controlStreamPort);
+    if (finding.answers) {
+        KVR_LOG("Host", 4, "Devices can connect to TCP port %1%", controlStreamPort);
+    }
+    for (const std::string& line : finding.advice) {
+        KVR_LOG("Host", 2, "%1%", line);
+    }
+}
+
+void VHostApplication::OpenConsole()
+{
+    AddEventCommands(console, host.GetControlSystem());
+    AddStopCommand(console, [this] {
+        consoleStream->End();
+        orderlyStop.Request();
+    });
+    AddCameraCommands(console, host.Cameras());
+    AddCameraState(console, host.Cameras());
+
+    consoleStream = std::make_unique<VConsoleStream>(console, STDIN_FILENO, STDOUT_FILENO);
+    consoleStream->WriteLine("ready");
+}
+
+void VHostApplication::StopPlugin()
+{
+    (*plugin)->Stop();
+    plugin.reset();
+}
+
+} // namespace QuorixHost
