@@ -1,0 +1,45 @@
+#include "korva-control/Arguments.h"
+
+#include <algorithm>
+
+namespace {
+
+// No text that is sent can hold it, and a word that begins with it is marked once more.
+constexpr char Mark = '\x1F';
+
+bool IsNotation(const std::string& word)
+{
+    return word == "++" || (!word.empty() && (word[0] == '[' || word[0] == Mark));
+}
+
+} // namespace
+
+std::vector<std::string> ProtectArguments(int argc, const char* const* argv)
+{
+    std::vector<std::string> words;
+    bool plain = false;
+    for (int i = 1; i < argc; ++i) {
+        const std::string word = argv[i];
+        if (!plain && word == "--") {
+            plain = true;
+            continue;
+        }
+        const bool marked = IsNotation(word) || (plain && !word.empty() && word[0] == '-');
+        words.push_back(marked ? Mark + word : word);
+    }
+    return words;
+}
+
+std::string PlainWord(std::string word)
+{
+    if (!word.empty() && word[0] == Mark) {
+        word.erase(0, 1);
+    }
+    return word;
+}
+
+std::string PlainMessage(std::string message)
+{
+    message.erase(std::remove(message.begin(), message.end(), Mark), message.end());
+    return message;
+}

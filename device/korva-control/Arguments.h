@@ -1,0 +1,18 @@
+#pragma once
+
+#include <string>
+#include <vector>
+
+// The parser of the command line reads some words as a notation of its own: "++" ends a command,
+// "[a,b]" is a list of two, and behind "--" a word is only plain where the command wants more. Here
+// every word stands for itself, since any text may be the name of a command or a parameter.
+
+/// Returns the program's arguments for the parser, with such words marked, and everything behind
+/// "--" marked plain.
+std::vector<std::string> ProtectArguments(int argc, const char* const* argv);
+
+/// Takes the mark from a word; to be applied to every text that an option or argument receives.
+std::string PlainWord(std::string word);
+
+/// Takes all marks from a message of the parser.
+std::string PlainMessage(std::string message);

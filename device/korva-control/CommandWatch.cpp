@@ -1,0 +1,105 @@
+#include "korva-control/Arguments.h"
+#include "korva-control/Commands.h"
+#include "korva-control/Session.h"
+#include "korva-control/StopSignals.h"
+#include "korva-control/TerminalText.h"
+
+#include <algorithm>
+
+#include <CLI/CLI.hpp>
+
+namespace {
+
+using ControlStream::EErrorKind;
+using ControlStream::VClient;
+using ControlStream::VError;
+using ControlStream::VEvent;
+
+/// The parser would take a negative number for a very great one.
+std::string CheckCount(const std::string& text)
+{
+    const bool good = text.find_first_not_of("0123456789") == std::string::npos &&
+                      text.find_first_not_of('0') != std::string::npos;
+    return good ? std::string() : "a count is a whole number above 0";
+}
+
+class VCommandWatch : public ICommand
+{
+public:
+    CLI::App* AddTo(CLI::App& program) override
+    {
+        CLI::App* command =
+            program.add_subcommand("watch", "Print the host's events as they come, until Ctrl-C");
+        command->footer(
+            "A --timeout that is given bounds the whole of it; without one it goes on.");
+        command->add_option("EVENT", names, "Only events of these names; all where none is given")
+            ->transform(&PlainWord);
+        command->add_option("--count", count, "End after so many events")->check(&CheckCount);
+        return command;
+    }
+
+    EExitCode Run(VSession& session) override
+    {
+        VClient& client = session.Connect();
+        // A host that answers has entered this connection among those that hear events, so that
+        // none is missed from the notice on.
+        client.GetServerInformation();
+        const VStopSignals stop(client); // until here a signal ends the program, as any other
+        PrintNotice("watching " + session.Peer());
+
+        const auto start = std::chrono::steady_clock::now();
+        std::uint64_t seen = 0;
+        while (seen < count && !stop.IsRequested()) {
+            const std::chrono::milliseconds left = TimeLeft(session, start);
+            const std::optional<VEvent> event = client.WaitForEvent(left);
+            if (event && IsWanted(event->Name)) {
+                Print(session.Output(), *event);
+                ++seen;
+            } else if (!stop.IsRequested() && left <= std::chrono::milliseconds::zero()) {
+                throw VError(EErrorKind::TimedOut, "timed out, waiting for an event; " +
+                                                       std::to_string(seen) + " came in time");
+            }
+        }
+        return EExitCode::Done;
+    }
+
+private:
+    static std::chrono::milliseconds TimeLeft(const VSession& session,
+                                              std::chrono::steady_clock::time_point start)
+    {
+        if (!session.IsTimeLimitGiven()) {
+            return ControlStream::NoLimit;
+        }
+        const auto left = session.TimeLimit() - (std::chrono::steady_clock::now() - start);
+        return std::max(std::chrono::ceil<std::chrono::milliseconds>(left),
+                        std::chrono::milliseconds::zero());
+    }
+
+    bool IsWanted(const std::string& name) const
+    {
+        return names.empty() || std::find(names.begin(), names.end(), name) != names.end();
+    }
+
+    static void Print(VOutput& output, const VEvent& event)
+    {
+        if (output.IsJson()) {
+            output.PrintJson({{"event", event.Name}, {"parameters", ToJson(event.Parameters)}});
+            return;
+        }
+        std::string line = ForTerminal(event.Name);
+        for (const ControlStream::VParameter& parameter : event.Parameters) {
+            line += " " + ForTerminal(parameter.Name) + "=" + WordForTerminal(parameter.Value);
+        }
+        output.PrintLine(line);
+    }
+
+    std::vector<std::string> names;
+    std::uint64_t count = std::numeric_limits<std::uint64_t>::max();
+};
+
+} // namespace
+
+std::unique_ptr<ICommand> MakeCommandWatch()
+{
+    return std::make_unique<VCommandWatch>();
+}

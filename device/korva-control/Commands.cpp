@@ -1,0 +1,16 @@
+#include "korva-control/Commands.h"
+
+std::vector<std::unique_ptr<ICommand>> MakeCommands()
+{
+    std::vector<std::unique_ptr<ICommand>> commands;
+    commands.push_back(MakeCommandInfo());
+    commands.push_back(MakeCommandCameras());
+    commands.push_back(MakeCommandCommands());
+    commands.push_back(MakeCommandDescribe());
+    commands.push_back(MakeCommandEvents());
+    commands.push_back(MakeCommandDescribeEvent());
+    commands.push_back(MakeCommandRun());
+    commands.push_back(MakeCommandWatch());
+    commands.push_back(MakeCommandRaw());
+    return commands;
+}

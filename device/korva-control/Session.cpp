@@ -1,0 +1,43 @@
+#include "korva-control/Session.h"
+
+#include "korva-control/TerminalText.h"
+
+#include <cmath>
+#include <cstdio>
+
+namespace {
+
+constexpr double DefaultSeconds = 5;
+
+} // namespace
+
+VSession::VSession(const VSessionOptions& sessionOptions)
+    : options(sessionOptions), output(sessionOptions.Json)
+{
+    client.SetTimeLimit(TimeLimit());
+}
+
+ControlStream::VClient& VSession::Connect()
+{
+    if (!client.IsConnected()) {
+        client.Connect(options.Host, options.Port, TimeLimit());
+    }
+    return client;
+}
+
+std::chrono::milliseconds VSession::TimeLimit() const
+{
+    const double seconds = options.Timeout.value_or(DefaultSeconds);
+    return std::chrono::milliseconds(static_cast<std::int64_t>(std::ceil(seconds * 1000)));
+}
+
+std::string VSession::Peer() const
+{
+    return options.Host + ":" + std::to_string(options.Port);
+}
+
+void PrintNotice(const std::string& text)
+{
+    const std::string line = "korva-control: " + ForTerminal(text) + "\n";
+    std::fputs(line.c_str(), stderr);
+}

@@ -1,0 +1,11 @@
+#pragma once
+
+#include <cstdint>
+
+/// Returns how many segments with data the kernel has received on a TCP socket, -1 where it does
+/// not tell.
+int DataSegmentsIn(int descriptor);
+
+/// Returns the descriptor of this process that is connected to a port of the loopback interface,
+/// -1 where there is none.
+int SocketTo(std::uint16_t port);
