@@ -1,0 +1,70 @@
+#include "Comparison.h"
+
+#include <algorithm>
+#include <chrono>
+#include <ctime>
+
+namespace {
+
+double ThreadSeconds()
+{
+    timespec time{};
+    clock_gettime(CLOCK_THREAD_CPUTIME_ID, &time);
+    return static_cast<double>(time.tv_sec) + static_cast<double>(time.tv_nsec) * 1e-9;
+}
+
+} // namespace
+
+double SecondsOf(const std::function<void()>& work)
+{
+    const auto start = std::chrono::steady_clock::now();
+    work();
+    return std::chrono::duration<double>(std::chrono::steady_clock::now() - start).count();
+}
+
+double ProcessorSecondsOf(const std::function<void()>& work)
+{
+    const double start = ThreadSeconds();
+    work();
+    return ThreadSeconds() - start;
+}
+
+double MedianOf(std::vector<double> numbers)
+{
+    const auto middle = numbers.begin() + static_cast<std::ptrdiff_t>(numbers.size() / 2);
+    std::nth_element(numbers.begin(), middle, numbers.end());
+    return *middle;
+}
+
+nlohmann::json Compare(unsigned rounds, const std::function<void()>& own,
+                       const std::function<void()>& limit, std::optional<double> aim)
+{
+    own(); // the first of each finds cold caches and grows its buffers
+    limit();
+
+    std::vector<double> ownTimes;
+    std::vector<double> limitTimes;
+    std::vector<double> ratios;
+    for (unsigned i = 0; i < rounds; ++i) {
+        // Who goes first changes, or the second would always find what the first has warmed.
+        const bool ownFirst = i % 2 == 0;
+        const double first = ProcessorSecondsOf(ownFirst ? own : limit);
+        const double second = ProcessorSecondsOf(ownFirst ? limit : own);
+        ownTimes.push_back(ownFirst ? first : second);
+        limitTimes.push_back(ownFirst ? second : first);
+        ratios.push_back(ownTimes.back() / limitTimes.back());
+    }
+
+    nlohmann::json result = {
+        {"own_ms", MedianOf(ownTimes) * 1e3},
+        {"limit_ms", MedianOf(limitTimes) * 1e3},
+        {"ratio", MedianOf(ratios)},
+        {"ratio_range",
+         {*std::min_element(ratios.begin(), ratios.end()),
+          *std::max_element(ratios.begin(), ratios.end())}},
+    };
+    if (aim) {
+        result["aim"] = *aim;
+    }
+    return result;
+}
