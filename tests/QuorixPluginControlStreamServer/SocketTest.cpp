@@ -345,10 +345,15 @@ TEST(Socket, AcceptErrorEndsAcceptingForGoodAndNothingElseIsKept)
         EXPECT_EQ("A", established.Request("A"));
     };
 
-    // Ends the pending accept with an error, and then listens as before.
+    // Ends the pending accept with an error, and then listens as before. Newer kernels take the
+    // port away with the shutdown, older ones refuse to give it twice.
     const int descriptor = ListenerOf(socket.Port());
+    sockaddr_in own{};
+    socklen_t size = sizeof own;
+    ASSERT_EQ(0, ::getsockname(descriptor, reinterpret_cast<sockaddr*>(&own), &size));
     ASSERT_EQ(0, ::shutdown(descriptor, SHUT_RDWR));
     fence();
+    (void)::bind(descriptor, reinterpret_cast<const sockaddr*>(&own), size);
     ASSERT_EQ(0, ::listen(descriptor, 8));
     VRawClient later(socket.Port());
     fence();
