@@ -1,0 +1,45 @@
+#include "QtQuickView/QmlKeysSignals.h"
+
+#include <Qt>
+
+// clang-format off
+const std::unordered_map<int, const char*> QmlKeysSignalMetaMethodLookup = {
+    {Qt::Key_Asterisk,   "asteriskPressed(QQuickKeyEvent*)"},
+    {Qt::Key_Back,       "backPressed(QQuickKeyEvent*)"},
+    {Qt::Key_Backtab,    "backtabPressed(QQuickKeyEvent*)"},
+    {Qt::Key_Call,       "callPressed(QQuickKeyEvent*)"},
+    {Qt::Key_Cancel,     "cancelPressed(QQuickKeyEvent*)"},
+    {Qt::Key_Context1,   "context1Pressed(QQuickKeyEvent*)"},
+    {Qt::Key_Context2,   "context2Pressed(QQuickKeyEvent*)"},
+    {Qt::Key_Context3,   "context3Pressed(QQuickKeyEvent*)"},
+    {Qt::Key_Context4,   "context4Pressed(QQuickKeyEvent*)"},
+    {Qt::Key_Delete,     "deletePressed(QQuickKeyEvent*)"},
+    {Qt::Key_0,          "digit0Pressed(QQuickKeyEvent*)"},
+    {Qt::Key_1,          "digit1Pressed(QQuickKeyEvent*)"},
+    {Qt::Key_2,          "digit2Pressed(QQuickKeyEvent*)"},
+    {Qt::Key_3,          "digit3Pressed(QQuickKeyEvent*)"},
+    {Qt::Key_4,          "digit4Pressed(QQuickKeyEvent*)"},
+    {Qt::Key_5,          "digit5Pressed(QQuickKeyEvent*)"},
+    {Qt::Key_6,          "digit6Pressed(QQuickKeyEvent*)"},
+    {Qt::Key_7,          "digit7Pressed(QQuickKeyEvent*)"},
+    {Qt::Key_8,          "digit8Pressed(QQuickKeyEvent*)"},
+    {Qt::Key_9,          "digit9Pressed(QQuickKeyEvent*)"},
+    {Qt::Key_Down,       "downPressed(QQuickKeyEvent*)"},
+    {Qt::Key_Enter,      "enterPressed(QQuickKeyEvent*)"},
+    {Qt::Key_Escape,     "escapePressed(QQuickKeyEvent*)"},
+    {Qt::Key_Flip,       "flipPressed(QQuickKeyEvent*)"},
+    {Qt::Key_Hangup,     "hangupPressed(QQuickKeyEvent*)"},
+    {Qt::Key_Left,       "leftPressed(QQuickKeyEvent*)"},
+    {Qt::Key_Menu,       "menuPressed(QQuickKeyEvent*)"},
+    {Qt::Key_No,         "noPressed(QQuickKeyEvent*)"},
+    {Qt::Key_Return,     "returnPressed(QQuickKeyEvent*)"},
+    {Qt::Key_Right,      "rightPressed(QQuickKeyEvent*)"},
+    {Qt::Key_Select,     "selectPressed(QQuickKeyEvent*)"},
+    {Qt::Key_Space,      "spacePressed(QQuickKeyEvent*)"},
+    {Qt::Key_Tab,        "tabPressed(QQuickKeyEvent*)"},
+    {Qt::Key_Up,         "upPressed(QQuickKeyEvent*)"},
+    {Qt::Key_VolumeDown, "volumeDownPressed(QQuickKeyEvent*)"},
+    {Qt::Key_VolumeUp,   "volumeUpPressed(QQuickKeyEvent*)"},
+    {Qt::Key_Yes,        "yesPressed(QQuickKeyEvent*)"},
+};
+// clang-format on
