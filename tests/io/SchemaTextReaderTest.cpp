@@ -216,6 +216,21 @@ TEST(SchemaTextReader, MemberThatFailsFailsTheWholeThoughOthersAreGood)
     EXPECT_TRUE(Fails(R"(["Void","Value",0,0,"",[],[],["d",]])"));
 }
 
+TEST(SchemaTextReader, MembersBehindOneThatFailsAreStillRead)
+{
+    ISchema schema;
+    const std::string text = R"(["Vod","Return",65536,3,"N",[],[],["d"]] rest)";
+    const char* cursor = text.c_str();
+
+    EXPECT_FALSE(ReadSchemaText(schema, cursor));
+
+    EXPECT_STREQ(" rest", cursor);
+    EXPECT_EQ(ERole::Return, schema.Role);
+    EXPECT_EQ(3u, schema.Count);
+    EXPECT_EQ("N", schema.TypeName);
+    EXPECT_EQ((std::vector<std::string>{"d"}), schema.Docs);
+}
+
 TEST(SchemaTextReader, ObjectSyntaxErrorsFail)
 {
     // clang-format off

@@ -255,6 +255,17 @@ TEST_F(CameraEvents, NameOfACameraThatCannotBeFetchedHasAnEmptyType)
     EXPECT_EQ(heard[0].parameters[2], std::pair(std::wstring(L"CameraType"), std::wstring()));
 }
 
+TEST_F(CameraEvents, NameOfACameraWithoutATypeHasAnEmptyType)
+{
+    Report("Device", "qx:7");
+    settings->Devices[{"Device", "qx:7"}]->Parameters.erase("DisplayType");
+
+    Change("Name");
+
+    ASSERT_EQ(heard.size(), 1U);
+    EXPECT_EQ(heard[0].parameters[2], std::pair(std::wstring(L"CameraType"), std::wstring()));
+}
+
 TEST_F(CameraEvents, PaddedIdIsPrintedAndFetchedWithoutItsZeros)
 {
     settings->Devices[{"Device", "qx:007"}] = settings->Devices[{"Device", "qx:7"}];

@@ -230,6 +230,18 @@ TEST_P(CameraNumbers, AreWrittenAsDouble)
     EXPECT_THAT(Reply(), IsEmpty());
 }
 
+TEST_P(CameraNumbers, AreFoundThroughTheFirstLookUp)
+{
+    const Parameters input = {{L"Param_CameraDeviceId", L"7"}, {GetParam().wireParameter, L"0.75"}};
+
+    Run(GetParam().getter, input);
+    Run(GetParam().setter, input);
+
+    const VFakeDevice& camera = *settings->Devices[{"Device", "qx:7"}];
+    EXPECT_THAT(camera.Got, ElementsAre(GetParam().parameter, GetParam().parameter));
+    EXPECT_THAT(camera.Found, IsEmpty());
+}
+
 TEST_P(CameraNumbers, AreNotTestedForTheirRange)
 {
     const Parameters input = {{L"Param_CameraDeviceId", L"7"}, {GetParam().wireParameter, L"5.0"}};
@@ -519,6 +531,15 @@ TEST_F(CameraCommands, TapAnswers1WhateverBecomesOfIt)
     EXPECT_EQ(Run(L"CameraSettings_ToggleTap", {{L"Param_TapEnabled", L"1"}}), 1);
     EXPECT_EQ(Run(L"CameraSettings_GetTapEnabled", {}), 1);
     EXPECT_THAT(Reply(), IsEmpty());
+}
+
+TEST_F(CameraCommands, TapIsSetThroughTheFirstLookUp)
+{
+    Run(L"CameraSettings_ToggleTap", {{L"Param_TapEnabled", L"1"}});
+
+    const VFakeDevice& system = *settings->Devices[{"System", "Gen6System"}];
+    EXPECT_THAT(system.Got, ElementsAre("EnableTapToSelect"));
+    EXPECT_THAT(system.Found, IsEmpty());
 }
 
 TEST_F(CameraCommands, TapIsReadThroughTheSecondLookUp)
