@@ -1,10 +1,11 @@
-# quorix_add_test(NAME SOURCES... [LIBRARIES ...] [ARGUMENTS ...] [TIMEOUT s] [NAMESPACE])
+# quorix_add_test(NAME SOURCES... [LIBRARIES ...] [ARGUMENTS ...] [TIMEOUT s] [NAMESPACE] [WINDOWS])
 #
 # One GoogleTest binary and its entry in CTest. With NAMESPACE the test runs in a network namespace
 # of its own, where port 803 is free and may be bound; it is skipped (code 77) only where the kernel
-# forbids namespaces.
+# forbids namespaces. With WINDOWS its main makes a QApplication, whose windows Qt keeps in memory and
+# draws without a graphics card.
 function(quorix_add_test name)
-    cmake_parse_arguments(arg "NAMESPACE" "TIMEOUT" "SOURCES;LIBRARIES;ARGUMENTS;LABELS" ${ARGN})
+    cmake_parse_arguments(arg "NAMESPACE;WINDOWS" "TIMEOUT" "SOURCES;LIBRARIES;ARGUMENTS;LABELS" ${ARGN})
 
     add_executable(${name} ${arg_SOURCES})
     target_link_libraries(${name} PRIVATE ${arg_LIBRARIES} Quorix::options GTest::gmock_main)
@@ -20,6 +21,11 @@ function(quorix_add_test name)
     endif()
     set_tests_properties(${name} PROPERTIES TIMEOUT ${arg_TIMEOUT} SKIP_RETURN_CODE 77
         ENVIRONMENT "${QUORIX_TEST_ENVIRONMENT}")
+    if(arg_WINDOWS)
+        target_sources(${name} PRIVATE ${PROJECT_SOURCE_DIR}/tests/support/WindowTestMain.cpp)
+        target_link_libraries(${name} PRIVATE Qt5::Widgets GTest::gmock)
+        set_property(TEST ${name} APPEND PROPERTY ENVIRONMENT ${QUORIX_WINDOW_TEST_ENVIRONMENT})
+    endif()
     if(arg_LABELS)
         set_tests_properties(${name} PROPERTIES LABELS "${arg_LABELS}")
     endif()
@@ -31,4 +37,12 @@ set(QUORIX_TEST_ENVIRONMENT
     "ASAN_OPTIONS=detect_leaks=1:detect_stack_use_after_return=1"
     "UBSAN_OPTIONS=print_stacktrace=1"
     "TSAN_OPTIONS=suppressions=${PROJECT_SOURCE_DIR}/tests/support/tsan.supp:exitcode=66"
+)
+
+# Without the software backend a Quick view needs OpenGL, which the offscreen platform does not have.
+# What Qt's own libraries keep for the length of the process is no leak of the test's.
+set(QUORIX_WINDOW_TEST_ENVIRONMENT
+    "QT_QPA_PLATFORM=offscreen"
+    "QT_QUICK_BACKEND=software"
+    "LSAN_OPTIONS=suppressions=${PROJECT_SOURCE_DIR}/tests/support/lsan.supp:print_suppressions=0"
 )
