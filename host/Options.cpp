@@ -22,9 +22,17 @@ const char* const description =
 
 const char* const footer =
     "Console commands, one a line, each answered by one line (ok, ok <JSON> or error: <reason>):\n"
-    "  fire EVENT [NAME=VALUE]...  publishes an event; a value in double quotes may hold blanks\n"
-    "  state                       the host's state as JSON\n"
-    "  quit                        stops the host in order\n"
+    "  set CLASS ID PARAMETER VALUE        asks for a value, as the host's user would\n"
+    "  get CLASS ID PARAMETER              the value that was asked for last, as JSON text\n"
+    "  mode N NUMBER                       asks camera N for a greyscale mode by its number\n"
+    "  select [N,N,...]                    replaces the camera selection\n"
+    "  add N                               a camera appears\n"
+    "  remove N                            a camera goes\n"
+    "  notify CLASS ID PARAMETER COUNT     fires the parameter's change notification COUNT times\n"
+    "  fire EVENT [NAME=VALUE]...          publishes an event; quotes keep a value's blanks\n"
+    "  state                               the host's state as JSON\n"
+    "  locks                               who holds and who waits for the data store, as JSON\n"
+    "  quit                                stops the host in order\n"
     "\n"
     "SIGINT and SIGTERM stop the host in order, a second one ends it at once with code 130.\n"
     "Exit codes: 0 stopped in order, 1 could not start, 2 wrong usage, 130 ended by force.";

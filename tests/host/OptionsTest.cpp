@@ -72,7 +72,7 @@ TEST(Options, HelpAndVersionGoToTheOutputAndEndWith0)
     EXPECT_FALSE(help.line.options);
     EXPECT_EQ(0, help.line.exitCode);
     for (const char* const option : {"--plugin", "--cameras", "--headless", "--data", "--log",
-                                     "--console", "--version", "--help", "fire", "state", "quit"}) {
+                                     "--console", "--version", "--help"}) {
         EXPECT_THAT(help.output.str(), HasSubstr(option));
     }
     EXPECT_EQ("", help.errors.str());
@@ -81,6 +81,18 @@ TEST(Options, HelpAndVersionGoToTheOutputAndEndWith0)
     EXPECT_FALSE(version.line.options);
     EXPECT_EQ(0, version.line.exitCode);
     EXPECT_EQ("quorix-host " QUORIX_VERSION "\n", version.output.str());
+}
+
+TEST(Options, HelpTellsEveryConsoleCommand)
+{
+    const VParsed help({"--help"});
+
+    for (const char* const command :
+         {"set CLASS ID PARAMETER VALUE", "get CLASS ID PARAMETER", "mode N NUMBER",
+          "select [N,N,...]", "add N", "remove N", "notify CLASS ID PARAMETER COUNT",
+          "fire EVENT [NAME=VALUE]...", "state", "locks", "quit"}) {
+        EXPECT_THAT(help.output.str(), HasSubstr("\n  " + std::string(command) + "  "));
+    }
 }
 
 TEST(Options, WhatIsWrongIsNamedAndEndsWith2)
