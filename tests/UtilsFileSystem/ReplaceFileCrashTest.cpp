@@ -1,0 +1,70 @@
+#include "UtilsFileSystem/ReplaceFile.h"
+#include "support/TemporaryFolder.h"
+#include "support/TracedProcess.h"
+
+#include <gtest/gtest.h>
+
+#include <filesystem>
+
+using TestSupport::ContentOf;
+using TestSupport::VTemporaryFolder;
+using TestSupport::WriteFile;
+using UtilsFileSystem::ReplaceFile;
+
+namespace {
+
+// Greater than a stream's buffer, so that it is written in its own system call.
+const std::string oldContent(100000, 'o');
+const std::string newContent(120000, 'n');
+
+TEST(ReplaceFileCrash, LeavesTheOldOrTheNewFileWhole)
+{
+    const VTemporaryFolder folder;
+    const std::string path = folder.Path("file");
+    std::size_t oldFound = 0;
+    std::size_t newFound = 0;
+
+    const std::size_t kills = TestSupport::KillAtEachStep(
+        [&] { WriteFile(path, oldContent); }, [&] { ReplaceFile(path, newContent); },
+        [&] {
+            const std::string found = ContentOf(path);
+            oldFound += found == oldContent ? 1 : 0;
+            newFound += found == newContent ? 1 : 0;
+            EXPECT_TRUE(found == oldContent || found == newContent) << found.size();
+        });
+
+    EXPECT_GT(kills, 10U);
+    EXPECT_EQ(oldFound + newFound, kills);
+    EXPECT_GT(oldFound, 0U);
+    EXPECT_GT(newFound, 0U);
+}
+
+TEST(ReplaceFileCrash, LeavesNoFileOrTheNewOneWhereThereWasNone)
+{
+    const VTemporaryFolder folder;
+    const std::string path = folder.Path("file");
+
+    const std::size_t kills = TestSupport::KillAtEachStep(
+        [&] { std::filesystem::remove(path); }, [&] { ReplaceFile(path, newContent); },
+        [&] {
+            const std::string found = ContentOf(path);
+            EXPECT_TRUE(found == "(no file)" || found == newContent) << found.size();
+        });
+
+    EXPECT_GT(kills, 10U);
+}
+
+TEST(ReplaceFileCrash, DoesNotHinderTheNextOne)
+{
+    const VTemporaryFolder folder;
+    const std::string path = folder.Path("file");
+
+    TestSupport::KillAtEachStep([&] { WriteFile(path, oldContent); },
+                                [&] { ReplaceFile(path, newContent); },
+                                [&] {
+                                    EXPECT_TRUE(ReplaceFile(path, "next"));
+                                    EXPECT_EQ(ContentOf(path), "next");
+                                });
+}
+
+} // namespace
