@@ -31,7 +31,7 @@ Item {
         width: Math.min(height, parent.width / 4)
         source: "qrc:/images/ControlLogo.svg"
         sourceSize: Qt.size(2 * width, 2 * width) // enough for a display of double resolution
-        fillMode: Image.PreserveAspectRatio
+        fillMode: Image.PreserveAspectFit
     }
 
     Label {

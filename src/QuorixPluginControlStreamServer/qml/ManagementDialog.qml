@@ -150,7 +150,7 @@ Item {
                 height: width
                 source: "qrc:/images/ControlIcon.svg"
                 sourceSize: Qt.size(2 * width, 2 * width)
-                fillMode: Image.PreserveAspectRatio
+                fillMode: Image.PreserveAspectFit
             }
 
             Image {
@@ -160,7 +160,7 @@ Item {
                 visible: itemAuthorised
                 source: "qrc:/images/ControlAllowed.svg"
                 sourceSize: imageControl.sourceSize
-                fillMode: Image.PreserveAspectRatio
+                fillMode: Image.PreserveAspectFit
             }
 
             Image {
@@ -170,7 +170,7 @@ Item {
                 visible: !itemAuthorised
                 source: "qrc:/images/ControlBanned.svg"
                 sourceSize: imageControl.sourceSize
-                fillMode: Image.PreserveAspectRatio
+                fillMode: Image.PreserveAspectFit
             }
 
             Text {
