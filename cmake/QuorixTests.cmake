@@ -1,19 +1,20 @@
-# quorix_add_test(NAME SOURCES... [LIBRARIES ...] [ARGUMENTS ...] [TIMEOUT s] [NAMESPACE] [WINDOWS])
+# quorix_add_test(NAME SOURCES... [LIBRARIES ...] [ARGUMENTS ...] [LAUNCHER ...] [TIMEOUT s]
+#                 [NAMESPACE] [WINDOWS])
 #
 # One GoogleTest binary and its entry in CTest. With NAMESPACE the test runs in a network namespace
 # of its own, where port 803 is free and may be bound; it is skipped (code 77) only where the kernel
 # forbids namespaces. With WINDOWS its main makes a QApplication, whose windows Qt keeps in memory and
-# draws without a graphics card.
+# draws without a graphics card. LAUNCHER is a command that runs the test as its arguments.
 function(quorix_add_test name)
-    cmake_parse_arguments(arg "NAMESPACE;WINDOWS" "TIMEOUT" "SOURCES;LIBRARIES;ARGUMENTS;LABELS" ${ARGN})
+    cmake_parse_arguments(arg "NAMESPACE;WINDOWS" "TIMEOUT" "SOURCES;LIBRARIES;ARGUMENTS;LABELS;LAUNCHER" ${ARGN})
 
     add_executable(${name} ${arg_SOURCES})
     target_link_libraries(${name} PRIVATE ${arg_LIBRARIES} Quorix::options GTest::gmock_main)
     target_include_directories(${name} PRIVATE ${PROJECT_SOURCE_DIR}/tests)
 
-    set(launcher "")
+    set(launcher ${arg_LAUNCHER})
     if(arg_NAMESPACE)
-        set(launcher ${PROJECT_SOURCE_DIR}/tests/support/in-network-namespace)
+        list(PREPEND launcher ${PROJECT_SOURCE_DIR}/tests/support/in-network-namespace)
     endif()
     add_test(NAME ${name} COMMAND ${launcher} $<TARGET_FILE:${name}> ${arg_ARGUMENTS})
     if(NOT arg_TIMEOUT)
