@@ -101,14 +101,14 @@ bool VMessageParserExecuteCommand::ReadParameters(const VElement& root,
     // Deliberate: only the first is looked for by its name. From there on every sibling counts as a
     // parameter, whatever it is, and one without a name spoils the whole message.
     for (; parameter != nullptr; parameter = parameter->next_sibling()) {
-        const std::wstring name = ChildValue(*parameter, L"Name");
+        std::wstring name = ChildValue(*parameter, L"Name");
         if (name.empty()) {
             return false;
         }
         std::wstring value = ChildValue(*parameter, L"Value");
         // Deliberate: the value alone is decoded, also where the XML parser has decoded it before.
         DecodeEntities(value);
-        parameters.Set(name, value);
+        parameters.Set(std::move(name), std::move(value));
     }
     return true;
 }

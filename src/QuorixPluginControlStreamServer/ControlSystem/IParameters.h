@@ -1,7 +1,10 @@
 #pragma once
 
+#include <functional>
 #include <map>
 #include <string>
+#include <string_view>
+#include <utility>
 
 namespace ControlSystem {
 
@@ -13,25 +16,29 @@ namespace ControlSystem {
 class IParameters
 {
 public:
-    using const_iterator = std::map<std::wstring, std::wstring>::const_iterator;
+    using Values = std::map<std::wstring, std::wstring, std::less<>>;
+    using const_iterator = Values::const_iterator;
 
     /// Returns a copy of the value under `name`, or the empty text where there is none: an absent
     /// parameter cannot be told from an empty one.
-    std::wstring Get(const std::wstring& name) const
+    std::wstring Get(std::wstring_view name) const
     {
         const auto found = values.find(name);
         return found == values.end() ? std::wstring() : found->second;
     }
 
     /// Inserts the value under `name`, or overwrites the one that is there.
-    void Set(const std::wstring& name, const std::wstring& value) { values[name] = value; }
+    void Set(std::wstring name, std::wstring value)
+    {
+        values.insert_or_assign(std::move(name), std::move(value));
+    }
 
     /// Iterates over pairs of name and value, ordered by the code units of the names.
     const_iterator begin() const { return values.begin(); }
     const_iterator end() const { return values.end(); }
 
 private:
-    std::map<std::wstring, std::wstring> values;
+    Values values;
 };
 
 } // namespace ControlSystem
