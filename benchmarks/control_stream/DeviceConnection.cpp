@@ -66,6 +66,15 @@ std::string ExecuteCommandFrame()
         "</Parameters></ExecuteCommand>");
 }
 
+std::string ReadStrobeFrame()
+{
+    return MakeFrame(R"(<?xml version="1.0" encoding="UTF-16" standalone="no"?>)"
+                     "<ExecuteCommand><Name>CameraSettings_GetStrobeIntensity</Name>"
+                     "<Correlation>1042</Correlation><Parameters>"
+                     "<Parameter><Name>Param_CameraDeviceId</Name><Value>1</Value></Parameter>"
+                     "</Parameters></ExecuteCommand>");
+}
+
 std::string ServerInformationFrame()
 {
     return MakeFrame(R"(<?xml version="1.0" encoding="UTF-16" standalone="no"?>)"

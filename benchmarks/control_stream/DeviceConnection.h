@@ -11,6 +11,9 @@ std::string MakeFrame(const std::string& text);
 /// The request that is measured: Host.Echo with two parameters.
 std::string ExecuteCommandFrame();
 
+/// The request that reads the strobe intensity of camera 1.
+std::string ReadStrobeFrame();
+
 /// A request that any control stream answers, as devices send it first.
 std::string ServerInformationFrame();
 

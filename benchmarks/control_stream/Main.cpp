@@ -25,7 +25,7 @@ using namespace ControlStreamBenchmark;
 using VJson = nlohmann::ordered_json;
 
 const std::vector<std::string> benchmarkNames{
-    "latency", "quick_acknowledgement", "connections", "churn", "fan_out", "memory"};
+    "latency", "quick_acknowledgement", "connections", "camera_read", "churn", "fan_out", "memory"};
 
 struct VOptions
 {
@@ -111,6 +111,9 @@ VJson MeasureRequests(const VOptions& options, const IServer* host)
     }
     if (options.Wants("connections")) {
         results["connections"] = MeasureConnections(settings, *host, limit, reply);
+    }
+    if (options.Wants("camera_read") && !options.Calibrate) {
+        results["camera_read"] = MeasureCameraRead(settings, *host, reply);
     }
     if (options.Wants("churn")) {
         results["churn"] = MeasureChurn(settings, *host, limit, reply);

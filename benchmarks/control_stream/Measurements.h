@@ -38,6 +38,13 @@ nlohmann::ordered_json MeasureQuickAcknowledgement(const VSettings& settings, co
 nlohmann::ordered_json MeasureConnections(const VSettings& settings, const IServer& host,
                                           const IServer& limit, const std::string& reply);
 
+/// 64 devices that read a camera's setting beside 64 that run the command which echoes, in turn and
+/// against the host alone.
+///
+/// @param echoReply  the host's reply to the latter
+nlohmann::ordered_json MeasureCameraRead(const VSettings& settings, const IServer& host,
+                                         const std::string& echoReply);
+
 /// 16 devices that connect, ask once and close, over and over.
 nlohmann::ordered_json MeasureChurn(const VSettings& settings, const IServer& host,
                                     const IServer& limit, const std::string& reply);
