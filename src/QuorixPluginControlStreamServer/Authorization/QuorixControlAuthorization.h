@@ -74,4 +74,41 @@ public:
 
     /// Replaces the known devices.
     void SetDevices(const VControlDevices& devices);
+
+private:
+    using Lock = KVR::VMutexLock;
+
+    std::weak_ptr<VQuorixControlAuthorization> Self();
+    VControlDevices ReadDevices() const;
+    void WriteDevices(const std::string& allowed, const std::string& banned);
+
+    // The steps of a request, on the postal service.
+    void RequestStep(const std::string& deviceId, const std::string& deviceName);
+    void ApplyOutcome(EAskOutcome outcome, const std::string& deviceId,
+                      const std::string& deviceName, const std::string& plainName);
+    void Remember(const std::string& deviceId, bool allowed, const std::string& plainName);
+    void ConnectStep(const std::string& deviceId, const std::string& deviceName);
+
+    void ScheduleCheck(const std::string& deviceId) KVR_REQUIRES(mutex);
+    void CheckHeartbeat(const std::string& deviceId, std::uint64_t number);
+
+    std::shared_ptr<IQuorixControlAuthorizationGUI> GUI();
+    void SetCurrentDeviceId(const std::string& deviceId);
+
+    // Released in reverse: the timer before the service that it waits on.
+    KVR::VMutex mutex; // lock order: this one, then the store's within the heartbeat check
+    VControlDevices devices KVR_GUARDED_BY(mutex);
+    const std::shared_ptr<KVR::IPostalService> postalService;
+    const std::shared_ptr<IDataStore> store;
+    NotificationSystem::VMultiCallback<void(bool)> authorized;
+    NotificationSystem::VMultiCallback<void()> disconnected;
+    std::weak_ptr<IQuorixControlAuthorizationGUI> gui KVR_GUARDED_BY(mutex);
+    std::string currentDeviceId KVR_GUARDED_BY(mutex);
+    std::int64_t lastBeat KVR_GUARDED_BY(mutex) = 0; // by the clock below
+    const NotificationSystem::VDeadlineTimerFactory makeTimer;
+    const Clock clock;
+    const std::shared_ptr<NotificationSystem::VAsioPostalService> heartbeatMonitor;
+    std::shared_ptr<void> heartbeatTimer KVR_GUARDED_BY(mutex); // what keeps the next check alive
+    std::uint64_t checkNumber KVR_GUARDED_BY(mutex) = 0;        // of the check that the timer runs
+    std::atomic<bool> requestPending{false}; // set under the mutex, cleared and read without it
 };
