@@ -1,0 +1,8 @@
+#include "NSDBonjour/DnsServiceCalls.h"
+
+const VDnsServiceCalls& LibraryDnsServiceCalls()
+{
+    static const VDnsServiceCalls calls = {&DNSServiceRegister, &DNSServiceRefSockFD,
+                                           &DNSServiceProcessResult, &DNSServiceRefDeallocate};
+    return calls;
+}
