@@ -50,7 +50,7 @@ bool Learn(std::set<std::string, std::less<>>& known, std::string_view name)
 VReaderNode::VReaderNode(const VElement& element, bool strictSequence)
     : element(element),
       global(std::make_shared<VGlobalInfo>()),
-      path(element.type() == rapidxml::node_document ? "" : "/" + GetName())
+      path(element.type() == rapidxml::node_document ? "" : "/" + std::string(NameOf(element)))
 {
     global->StrictSequence = strictSequence;
 }
