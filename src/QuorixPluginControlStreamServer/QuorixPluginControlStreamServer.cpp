@@ -1,5 +1,6 @@
 #include "QuorixPluginControlStreamServer/QuorixPluginControlStreamServer.h"
 
+#include "NSDBonjour/BonjourRegistrar.h"
 #include "QuorixPluginControlStreamServer/ControlStreamServer/Server.h"
 #include "QuorixPluginControlStreamServer/ControlStreamServer/SocketASIO.h"
 #include "QuorixPluginControlStreamServer/ControlSystem/CommandProviderCameraSettings.h"
@@ -8,6 +9,11 @@
 #include "QuorixPluginControlStreamServer/ControlSystem/IControlSystem.h"
 #include "QuorixPluginInterface/IHost.h"
 #include "notification/MakeShared.h"
+
+#include <boost/asio/ip/host_name.hpp>
+
+#include <QCoreApplication>
+#include <QThread>
 
 #include <cstdint>
 
@@ -67,7 +73,19 @@ void VQuorixPluginControlStreamServer::RegisterProviders()
 
 void VQuorixPluginControlStreamServer::Advertise()
 {
-    // Devices find the host by its address: nothing is announced on the network.
+    auto* thread = new QThread;
+    auto* registrar = new VBonjourRegistrar;
+    registrar->moveToThread(thread);
+    qRegisterMetaType<VNSDService>("VNSDService");
+    QObject::connect(thread, &QThread::finished, thread, &QThread::deleteLater);
+    QObject::connect(registrar, &VBonjourRegistrar::error, thread, &QThread::quit);
+    QObject::connect(registrar, &VBonjourRegistrar::serviceRegistered, thread, &QThread::quit);
+    thread->start(QThread::InheritPriority);
+    const QString name = QCoreApplication::applicationName() + QStringLiteral(" on ") +
+                         QString::fromStdString(boost::asio::ip::host_name());
+    emit registrar->Register(name);
+    // Deliberate: neither is kept. The thread ends and deletes itself at the first outcome; the
+    // registrar is never deleted, as its end would withdraw the advertisement.
 }
 
 bool VQuorixPluginControlStreamServer::InitialiseGUI(QuorixPluginInterface::IHost& /*host*/,
