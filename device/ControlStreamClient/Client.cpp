@@ -139,6 +139,11 @@ void VClient::SetEventHandler(EventHandler handler)
     eventHandler = std::move(handler);
 }
 
+void VClient::SetEventHandler(const std::string& name, EventHandler handler)
+{
+    namedHandlers[name] = std::move(handler);
+}
+
 std::size_t VClient::DeliverEvents(std::chrono::milliseconds limit)
 {
     std::optional<VEvent> event = WaitForEvent(limit);
@@ -147,10 +152,7 @@ std::size_t VClient::DeliverEvents(std::chrono::milliseconds limit)
     std::size_t delivered = 0;
     while (event) {
         ++delivered;
-        const EventHandler handler = eventHandler; // it may set another
-        if (handler) {
-            handler(*event);
-        }
+        CallHandlers(*event);
         event.reset();
         if (others > 0 && !keptEvents.empty()) {
             --others;
@@ -158,6 +160,20 @@ std::size_t VClient::DeliverEvents(std::chrono::milliseconds limit)
         }
     }
     return delivered;
+}
+
+void VClient::CallHandlers(const VEvent& event) const
+{
+    const auto named = namedHandlers.find(event.Name);
+    // Copies, since a handler may set others.
+    const EventHandler first = named == namedHandlers.end() ? EventHandler() : named->second;
+    if (first) {
+        first(event);
+    }
+    const EventHandler second = eventHandler;
+    if (second) {
+        second(event);
+    }
 }
 
 std::uint64_t VClient::GetDroppedEventCount() const

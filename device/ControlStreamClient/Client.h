@@ -1,13 +1,14 @@
 #pragma once
 
-#include "ControlStreamClient/Error.h"
+#include "ControlStreamClient/EventHandlers.h"
+#include "ControlStreamClient/Outcome.h"
 #include "ControlStreamClient/Records.h"
 
 #include <chrono>
 #include <cstddef>
 #include <cstdint>
 #include <deque>
-#include <functional>
+#include <map>
 #include <memory>
 #include <optional>
 #include <string>
@@ -17,6 +18,7 @@ namespace ControlStream {
 
 class VConnection;
 class VDeadline;
+class VPipeline;
 enum class EMessageKind;
 struct VMessage;
 
@@ -59,7 +61,7 @@ struct VClientOptions
 class VClient
 {
 public:
-    using EventHandler = std::function<void(const VEvent&)>;
+    using EventHandler = ControlStream::EventHandler;
 
     explicit VClient(const VClientOptions& clientOptions = VClientOptions());
     ~VClient();
@@ -109,6 +111,19 @@ public:
     /// @param parameters  of two with one name the host takes the later
     VCommandReply ExecuteCommand(const std::string& name, const VParameters& parameters = {});
 
+    /// Runs many commands with several under way at once, and returns what came of each, in the
+    /// order of the calls.
+    ///
+    /// At most 64 KiB of requests are on their way without a reply, and replies are read while
+    /// requests are written, so that neither side can come to a stand. Each request has the time
+    /// limit by itself, counted from its sending. Where the host answers nothing any more, the
+    /// rest is given up unsent; where the connection ends, every call without a reply bears that
+    /// error, and those that were sent may have run.
+    ///
+    /// @throws VError  of the kind Usage where one call cannot be sent, with nothing sent of any;
+    ///                 of the kind NoConnection without a connection
+    std::vector<VOutcome<VCommandReply>> ExecuteBatch(const std::vector<VCall>& calls);
+
     /// Returns the next event, waiting for it if none is kept; empty where the limit ran out, or
     /// after Interrupt.
     std::optional<VEvent> WaitForEvent(std::chrono::milliseconds limit);
@@ -117,7 +132,11 @@ public:
     /// itself make requests. An empty one drops the events that are delivered.
     void SetEventHandler(EventHandler handler);
 
-    /// Waits for an event as WaitForEvent does, and passes it to the handler with every event that
+    /// The same for the events of one name; each event goes to this one, then to that of
+    /// SetEventHandler. An empty function takes back the one that is there.
+    void SetEventHandler(const std::string& name, EventHandler handler);
+
+    /// Waits for an event as WaitForEvent does, and passes it to its handlers with every event that
     /// is kept, in order.
     ///
     /// An exception of the handler passes through; the events behind the one that met it stay kept.
@@ -151,6 +170,10 @@ private:
     void GetInStep(const VDeadline& deadline);
     VMessage Await(EMessageKind kind, const std::string& correlation, const VDeadline& deadline,
                    const std::string& what);
+    void RunBatch(VPipeline& pipeline);
+    void TakeBatchReplies(VPipeline& pipeline);
+    void TakeLastReplies(VPipeline& pipeline);
+    void CallHandlers(const VEvent& event) const;
     bool KeepIfEvent(const std::string& text);
     void Keep(VEvent event, std::size_t size);
     VEvent TakeKept();
@@ -164,6 +187,7 @@ private:
     VClientOptions options;
     std::unique_ptr<VConnection> connection;
     EventHandler eventHandler;
+    std::map<std::string, EventHandler> namedHandlers;
     std::deque<VKeptEvent> keptEvents;
     std::size_t keptBytes = 0;
     std::uint64_t droppedEvents = 0;

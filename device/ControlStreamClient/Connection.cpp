@@ -62,24 +62,24 @@ VConnection::~VConnection()
 }
 
 void VConnection::Open(const std::string& host, std::uint16_t port, const VDeadline& deadline,
-                       const LookUp& lookUp)
+                       const LookUp& lookUp, const VWaitPart& onWait)
 {
     Close();
     arrived.Clear();
-    const std::vector<in_addr> addresses = FindAddresses(host, deadline, lookUp);
+    const std::vector<in_addr> addresses = FindAddresses(host, deadline, lookUp, onWait);
     const std::string peer = host + ":" + std::to_string(port);
     std::string reason;
     for (std::size_t i = 0; i < addresses.size(); ++i) {
         try {
             // An address that never answers must leave time for those behind it.
-            if (ConnectTo(addresses[i], port, deadline.Part(addresses.size() - i))) {
+            if (ConnectTo(addresses[i], port, deadline.Part(addresses.size() - i), onWait)) {
                 SetOptions();
                 return;
             }
             reason.clear();
         } catch (const std::system_error& error) {
             reason = error.code().message();
-        } catch (const VError&) {
+        } catch (...) {
             Close();
             throw;
         }
@@ -131,6 +131,49 @@ EWaited VConnection::ReceiveInterruptibly(std::string& text, const VDeadline& de
     return ReceiveFrame(text, deadline, true);
 }
 
+EWaited VConnection::Turn(VSendQueue& queue, const VDeadline& deadline, bool interruptible)
+{
+    if (!IsOpen()) {
+        throw VError(EErrorKind::NoConnection, "there is no connection to a host");
+    }
+    SendQueued(queue);
+    const short reading = arrived.IsFull() ? 0 : POLLIN;
+    const short writing = queue.IsEmpty() ? 0 : POLLOUT;
+    std::array<pollfd, 2> descriptors{{{socket, static_cast<short>(reading | writing), 0},
+                                       {interruptible ? wake : -1, POLLIN, 0}}};
+    if (!Poll(descriptors, deadline)) {
+        return EWaited::TimedOut;
+    }
+    // A socket that has failed says so by reading.
+    if ((descriptors[0].revents & ~POLLOUT) != 0) {
+        ReadSome();
+    }
+    if (descriptors[1].revents != 0) {
+        TakeInterrupt();
+        return EWaited::Interrupted;
+    }
+    return EWaited::Ready;
+}
+
+bool VConnection::Flush(VSendQueue& queue, const VDeadline& deadline)
+{
+    SendQueued(queue);
+    while (!queue.IsEmpty() && WaitWhileSending(deadline)) {
+        SendQueued(queue);
+    }
+    return queue.IsEmpty();
+}
+
+EWaited VConnection::WaitForInterrupt(const VDeadline& deadline)
+{
+    std::array<pollfd, 1> descriptors{{{wake, POLLIN, 0}}};
+    if (!Poll(descriptors, deadline)) {
+        return EWaited::TimedOut;
+    }
+    TakeInterrupt();
+    return EWaited::Interrupted;
+}
+
 bool VConnection::TakeArrived(std::string& text)
 {
     try {
@@ -168,7 +211,8 @@ void VConnection::Interrupt() noexcept
 }
 
 /// Returns false when the deadline is over.
-bool VConnection::ConnectTo(const in_addr& address, std::uint16_t port, const VDeadline& deadline)
+bool VConnection::ConnectTo(const in_addr& address, std::uint16_t port, const VDeadline& deadline,
+                            const VWaitPart& onWait)
 {
     socket = ::socket(AF_INET, SOCK_STREAM | SOCK_NONBLOCK | SOCK_CLOEXEC, 0);
     if (socket < 0) {
@@ -184,8 +228,7 @@ bool VConnection::ConnectTo(const in_addr& address, std::uint16_t port, const VD
     if (errno != EINPROGRESS && errno != EINTR) {
         throw std::system_error(errno, std::generic_category());
     }
-    std::array<pollfd, 1> descriptors{{{socket, POLLOUT, 0}}};
-    if (!Poll(descriptors, deadline)) {
+    if (!WaitForConnection(deadline, onWait)) {
         return false;
     }
     int code = 0;
@@ -195,6 +238,24 @@ bool VConnection::ConnectTo(const in_addr& address, std::uint16_t port, const VD
         throw std::system_error(code, std::generic_category());
     }
     return true;
+}
+
+/// Returns false when the deadline is over.
+bool VConnection::WaitForConnection(const VDeadline& deadline, const VWaitPart& onWait)
+{
+    for (;;) {
+        const VDeadline part = onWait ? deadline.Sooner(onWait()) : deadline;
+        std::array<pollfd, 2> descriptors{{{socket, POLLOUT, 0}, {onWait ? wake : -1, POLLIN, 0}}};
+        const bool ready = Poll(descriptors, part);
+        if (ready && descriptors[0].revents != 0) {
+            return true;
+        }
+        if (ready) {
+            TakeInterrupt();
+        } else if (deadline.IsOver()) {
+            return false;
+        }
+    }
 }
 
 /// Options are a matter of speed: where one is refused, the connection serves all the same.
@@ -228,11 +289,29 @@ bool VConnection::SendSome(const unsigned char (&header)[FrameHeaderSize], const
         return false;
     }
     if (errno != EINTR) {
-        const std::string reason = ErrorText(errno);
-        SaveWhatArrived();
-        FailClosed(reason);
+        FailSending(errno);
     }
     return true;
+}
+
+void VConnection::SendQueued(VSendQueue& queue)
+{
+    while (!queue.IsEmpty()) {
+        const ssize_t count = send(socket, queue.Data(), queue.Size(), MSG_NOSIGNAL);
+        if (count >= 0) {
+            queue.Advance(static_cast<std::size_t>(count));
+        } else if (errno == EAGAIN) {
+            break;
+        } else if (errno != EINTR) {
+            FailSending(errno);
+        }
+    }
+}
+
+void VConnection::FailSending(int code)
+{
+    SaveWhatArrived();
+    FailClosed(ErrorText(code));
 }
 
 /// The host's last words, which say why it goes, may lie unread when a write finds it gone.
@@ -292,11 +371,16 @@ EWaited VConnection::WaitForBytes(const VDeadline& deadline, bool interruptible)
         return EWaited::TimedOut;
     }
     if (descriptors[1].revents != 0) {
-        eventfd_t ignored = 0;
-        eventfd_read(wake, &ignored);
+        TakeInterrupt();
         return EWaited::Interrupted;
     }
     return EWaited::Ready;
+}
+
+void VConnection::TakeInterrupt()
+{
+    eventfd_t ignored = 0;
+    eventfd_read(wake, &ignored);
 }
 
 /// Reads what is there. Returns false where nothing is, after all.

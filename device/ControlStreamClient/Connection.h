@@ -3,6 +3,7 @@
 #include "ControlStreamClient/Deadline.h"
 #include "ControlStreamClient/FrameBuffer.h"
 #include "ControlStreamClient/HostAddress.h"
+#include "ControlStreamClient/SendQueue.h"
 
 #include <cstdint>
 #include <string>
@@ -30,8 +31,9 @@ public:
     /// Connects to the first of the host's addresses that accepts, closing an earlier connection.
     ///
     /// @param lookUp  how the addresses of a name are found
+    /// @param onWait  asked before each part of the wait, see VWaitPart; may be empty
     void Open(const std::string& host, std::uint16_t port, const VDeadline& deadline,
-              const LookUp& lookUp = &LookUpAddresses);
+              const LookUp& lookUp = &LookUpAddresses, const VWaitPart& onWait = VWaitPart());
 
     bool IsOpen() const { return socket >= 0; }
 
@@ -52,6 +54,20 @@ public:
     /// The same, ended also by Interrupt.
     EWaited ReceiveInterruptibly(std::string& text, const VDeadline& deadline);
 
+    /// Sends what the kernel takes of the queue, then waits until there is something to read, which
+    /// it reads, or room to send the rest. It reads while it sends, as Send does.
+    ///
+    /// @param interruptible  whether Interrupt ends it too
+    EWaited Turn(VSendQueue& queue, const VDeadline& deadline, bool interruptible);
+
+    /// Sends the whole queue, reading meanwhile as Send does.
+    ///
+    /// @return false where the deadline came first
+    bool Flush(VSendQueue& queue, const VDeadline& deadline);
+
+    /// Waits for nothing but Interrupt, connected or not.
+    EWaited WaitForInterrupt(const VDeadline& deadline);
+
     /// Takes a frame that has arrived whole already; false where there is none. Reads nothing.
     bool TakeArrived(std::string& text);
 
@@ -64,14 +80,19 @@ public:
     void Interrupt() noexcept;
 
 private:
-    bool ConnectTo(const in_addr& address, std::uint16_t port, const VDeadline& deadline);
+    bool ConnectTo(const in_addr& address, std::uint16_t port, const VDeadline& deadline,
+                   const VWaitPart& onWait);
+    bool WaitForConnection(const VDeadline& deadline, const VWaitPart& onWait);
     void SetOptions();
     bool SendSome(const unsigned char (&header)[FrameHeaderSize], const std::string& text,
                   std::size_t& sent);
+    void SendQueued(VSendQueue& queue);
+    [[noreturn]] void FailSending(int code);
     void SaveWhatArrived();
     bool WaitWhileSending(const VDeadline& deadline);
     EWaited ReceiveFrame(std::string& text, const VDeadline& deadline, bool interruptible);
     EWaited WaitForBytes(const VDeadline& deadline, bool interruptible);
+    void TakeInterrupt();
     bool ReadSome();
     void AcknowledgeAtOnce();
     [[noreturn]] void FailClosed(const std::string& reason);

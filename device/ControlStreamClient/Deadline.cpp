@@ -42,6 +42,12 @@ VDeadline VDeadline::Part(std::size_t parts) const
     return VDeadline(Left() / std::max<std::size_t>(parts, 1));
 }
 
+VDeadline VDeadline::Sooner(std::chrono::milliseconds longest) const
+{
+    const VDeadline sooner(longest);
+    return sooner.end < end ? sooner : *this;
+}
+
 std::string VDeadline::LimitText() const
 {
     const auto count = limit.count();

@@ -26,6 +26,9 @@ public:
     /// A deadline after an equal part of what is left, which never lies behind this one.
     VDeadline Part(std::size_t parts) const;
 
+    /// This deadline, or the one after `longest` from now where that comes sooner.
+    VDeadline Sooner(std::chrono::milliseconds longest) const;
+
     /// The whole limit for people, as "2.5 s".
     std::string LimitText() const;
 

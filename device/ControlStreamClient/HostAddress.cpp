@@ -2,6 +2,7 @@
 
 #include "ControlStreamClient/Error.h"
 
+#include <algorithm>
 #include <chrono>
 #include <exception>
 #include <future>
@@ -37,14 +38,28 @@ std::future<VLookUpResult> StartLookUp(const std::string& host, const LookUp& lo
     return future;
 }
 
-bool WaitUntil(const std::future<VLookUpResult>& result, const VDeadline& deadline)
+// Nothing wakes who waits for a look-up, so that whoever wants to be asked meanwhile is asked so
+// often.
+constexpr std::chrono::milliseconds LookUpPart{20};
+
+bool WaitUntil(const std::future<VLookUpResult>& result, const VDeadline& deadline,
+               const VWaitPart& onWait)
 {
-    const int milliseconds = deadline.PollMilliseconds();
-    if (milliseconds < 0) {
-        result.wait();
-        return true;
+    for (;;) {
+        const VDeadline part = onWait ? deadline.Sooner(std::min(onWait(), LookUpPart)) : deadline;
+        const int milliseconds = part.PollMilliseconds();
+        if (milliseconds < 0) {
+            result.wait();
+            return true;
+        }
+        const auto waited = result.wait_for(std::chrono::milliseconds(milliseconds));
+        if (waited == std::future_status::ready) {
+            return true;
+        }
+        if (deadline.IsOver()) {
+            return false;
+        }
     }
-    return result.wait_for(std::chrono::milliseconds(milliseconds)) == std::future_status::ready;
 }
 
 } // namespace
@@ -70,14 +85,14 @@ VLookUpResult LookUpAddresses(const std::string& host)
 }
 
 std::vector<in_addr> FindAddresses(const std::string& host, const VDeadline& deadline,
-                                   const LookUp& lookUp)
+                                   const LookUp& lookUp, const VWaitPart& onWait)
 {
     in_addr address{};
     if (inet_pton(AF_INET, host.c_str(), &address) == 1) {
         return {address};
     }
     std::future<VLookUpResult> result = StartLookUp(host, lookUp);
-    if (!WaitUntil(result, deadline)) {
+    if (!WaitUntil(result, deadline, onWait)) {
         throw VError(EErrorKind::TimedOut, "timed out after " + deadline.LimitText() +
                                                ", waiting for the address of " + host);
     }

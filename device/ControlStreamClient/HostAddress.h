@@ -2,6 +2,7 @@
 
 #include "ControlStreamClient/Deadline.h"
 
+#include <chrono>
 #include <functional>
 #include <string>
 #include <vector>
@@ -17,6 +18,10 @@ struct VLookUpResult
     std::string Error;
 };
 
+/// Asked before each part of a wait: returns how long that part may be at most. What it throws ends
+/// the wait. An empty one lets the wait go through in one part.
+using VWaitPart = std::function<std::chrono::milliseconds()>;
+
 using LookUp = std::function<VLookUpResult(const std::string& host)>;
 
 /// Asks the system's resolver for the IPv4 addresses of a name or of a dotted address. It has time
@@ -31,6 +36,7 @@ VLookUpResult LookUpAddresses(const std::string& host);
 ///
 /// @throws VError  of the kind NoConnection without an address, TimedOut after the deadline
 std::vector<in_addr> FindAddresses(const std::string& host, const VDeadline& deadline,
-                                   const LookUp& lookUp = &LookUpAddresses);
+                                   const LookUp& lookUp = &LookUpAddresses,
+                                   const VWaitPart& onWait = VWaitPart());
 
 } // namespace ControlStream

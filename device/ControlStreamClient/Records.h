@@ -62,6 +62,13 @@ struct VEventInformation
     std::vector<VParameterInformation> Parameters;
 };
 
+/// A command to be run, with its parameters.
+struct VCall
+{
+    std::string Name;
+    VParameters Parameters;
+};
+
 /// The outcome of a command.
 struct VCommandReply
 {
