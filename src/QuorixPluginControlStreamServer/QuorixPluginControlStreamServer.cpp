@@ -1,9 +1,12 @@
 #include "QuorixPluginControlStreamServer/QuorixPluginControlStreamServer.h"
 
 #include "NSDBonjour/BonjourRegistrar.h"
+#include "QuorixPluginControlStreamServer/Authorization/QuorixControlAuthorization.h"
 #include "QuorixPluginControlStreamServer/ControlStreamServer/Server.h"
 #include "QuorixPluginControlStreamServer/ControlStreamServer/SocketASIO.h"
+#include "QuorixPluginControlStreamServer/ControlSystem/CommandProviderAuthorization.h"
 #include "QuorixPluginControlStreamServer/ControlSystem/CommandProviderCameraSettings.h"
+#include "QuorixPluginControlStreamServer/ControlSystem/EventProviderAuthorized.h"
 #include "QuorixPluginControlStreamServer/ControlSystem/EventProviderCameraSelection.h"
 #include "QuorixPluginControlStreamServer/ControlSystem/EventProviderCameraSettings.h"
 #include "QuorixPluginControlStreamServer/ControlSystem/IControlSystem.h"
@@ -43,11 +46,16 @@ bool VQuorixPluginControlStreamServer::Start(QuorixPluginInterface::IHost& host)
 void VQuorixPluginControlStreamServer::BuildAuthorizationAndProviders(
     QuorixPluginInterface::IHost& host)
 {
+    const std::shared_ptr<IDataStore> store = host.GetStore();
     const std::shared_ptr<ICameraSettingsSource> settings = host.GetCameraSettingsSource();
     const std::shared_ptr<ICameraSelectionSource> selection = host.GetCameraSelectionSource();
+    authorization = KVR::MakeShared<VQuorixControlAuthorization>(host.GetPostalService(), store);
 
+    commandProviders.push_back(std::make_shared<VCommandProviderAuthorization>(authorization));
     commandProviders.push_back(
         std::make_shared<VCommandProviderCameraSettings>(selection, settings));
+    eventProviders.push_back(
+        std::make_shared<VEventProviderAuthorized>(controlSystem.get(), authorization));
     eventProviders.push_back(
         KVR::MakeShared<VEventProviderCameraSelection>(controlSystem.get(), selection));
     eventProviders.push_back(

@@ -1,3 +1,4 @@
+#include "PluginBench.h"
 #include "QuorixPluginControlStreamServer/ControlSystem/ICommandProvider.h"
 #include "QuorixPluginControlStreamServer/ControlSystem/IEventProvider.h"
 #include "QuorixPluginInterface/IHost.h"
@@ -27,6 +28,12 @@
 
 // The plug-in as a host meets it: the built library, its two functions, and the real port.
 
+using PluginBench::CanConnect;
+using PluginBench::ComesTrue;
+using PluginBench::disconnect;
+using PluginBench::port;
+using PluginBench::VFakeGUI;
+using PluginBench::VLibrary;
 using QuorixPluginInterface::IPlugin;
 using testing::ElementsAre;
 using testing::IsEmpty;
@@ -36,126 +43,14 @@ using TestSupport::VRawClient;
 
 namespace {
 
-constexpr std::uint16_t port = 803;
-
 const char* const serverInformation =
     R"(<?xml version="1.0" encoding="UTF-16" standalone="no"?>)"
     R"(<ServerInformation><StreamVersion major="1" minor="0"/></ServerInformation>)";
 
-/// The library, loaded as a host does.
-class VLibrary
-{
-public:
-    VLibrary() : handle(dlopen(QUORIX_PLUGIN_LIBRARY, RTLD_NOW | RTLD_LOCAL))
-    {
-        if (handle == nullptr) {
-            throw std::runtime_error(dlerror());
-        }
-    }
-
-    IPlugin* Create() const { return Find<IPlugin* (*)()>("CreatePlugin")(); }
-    void Destroy(IPlugin* plugin) const { Find<void (*)(IPlugin*)>("DestroyPlugin")(plugin); }
-
-    /// Closes the handle. @return whether the library is still in memory
-    bool StaysWhenClosed()
-    {
-        dlclose(handle);
-        handle = dlopen(QUORIX_PLUGIN_LIBRARY, RTLD_NOW | RTLD_LOCAL | RTLD_NOLOAD);
-        return handle != nullptr;
-    }
-
-private:
-    template <typename TFunction>
-    TFunction Find(const char* name) const
-    {
-        void* const address = dlsym(handle, name);
-        if (address == nullptr) {
-            throw std::runtime_error(dlerror());
-        }
-        TFunction function = nullptr;
-        std::memcpy(&function, &address, sizeof function);
-        return function;
-    }
-
-    void* handle;
-};
-
-/// A host that supplies what a test gives it.
-class VFakeHost : public QuorixPluginInterface::IHost
-{
-public:
-    explicit VFakeHost(std::shared_ptr<IControlSystem> controlSystem)
-        : controlSystem(std::move(controlSystem))
-    {
-    }
-
-    std::shared_ptr<TestSupport::VFakeCameraSettings> Settings;
-    std::shared_ptr<TestSupport::VFakeCameraSelection> Selection;
-
-    std::shared_ptr<IDataStore> GetStore() override { return nullptr; }
-    std::shared_ptr<ICameraSettingsSource> GetCameraSettingsSource() override { return Settings; }
-    std::shared_ptr<KVR::IPostalService> GetPostalService() override { return nullptr; }
-    std::shared_ptr<ICameraSelectionSource> GetCameraSelectionSource() override
-    {
-        return Selection;
-    }
-    std::shared_ptr<IControlSystem> GetControlSystem() override { return controlSystem; }
-
-private:
-    const std::shared_ptr<IControlSystem> controlSystem;
-};
-
-class VFakeGUI : public IQuorixGUI
-{
-public:
-    std::shared_ptr<VQuickWidgetManager> GetQuickContext() override { return nullptr; }
-    std::shared_ptr<IMenuService> GetMenuService() override { return nullptr; }
-    std::shared_ptr<IPanelService> GetPanelService() override { return nullptr; }
-};
-
-bool CanConnect()
-{
-    try {
-        const VRawClient client(port);
-        return true;
-    } catch (const std::system_error&) {
-        return false;
-    }
-}
-
-/// Waits for what the socket's thread brings about by itself.
-template <typename TCondition>
-bool ComesTrue(TCondition condition)
-{
-    const auto deadline = std::chrono::steady_clock::now() + std::chrono::seconds(60);
-    while (!condition()) {
-        if (std::chrono::steady_clock::now() > deadline) {
-            return false;
-        }
-        std::this_thread::yield();
-    }
-    return true;
-}
-
-/// A plug-in object with a host whose dispatcher knows one command.
-class Plugin : public testing::Test
+/// As a plug-in of the tests, with a second one that lacks a system call.
+class Plugin : public PluginBench::VLoadedPlugin
 {
 protected:
-    Plugin()
-    {
-        controlSystem->CommandNames = {L"Test.Echo"};
-        controlSystem->Commands[L"Test.Echo"] = &VFakeControlSystem::Echo;
-    }
-    ~Plugin() override { Destroy(); }
-
-    /// Destroys the plug-in. A message that the socket's thread has answered, but not yet left,
-    /// holds the server until it has: the port is closed by that thread then, a moment later.
-    void Destroy()
-    {
-        library.Destroy(std::exchange(plugin, nullptr));
-        EXPECT_TRUE(ComesTrue([] { return !CanConnect(); }));
-    }
-
     /// Starts another plug-in, to which the kernel refuses a system call.
     /// @return the exception that left Start, empty for none
     std::string FailureWithout(unsigned int systemCall)
@@ -173,13 +68,6 @@ protected:
         library.Destroy(other);
         return failure;
     }
-
-    VLibrary library;
-    const std::shared_ptr<VFakeControlSystem> controlSystem =
-        std::make_shared<VFakeControlSystem>();
-    VFakeHost host{controlSystem};
-    VFakeHost hostWithoutServices{nullptr};
-    IPlugin* plugin = library.Create();
 };
 
 /// Returns the place of a virtual operation in the table that the host calls by.
@@ -278,21 +166,28 @@ TEST_F(Plugin, StartedItServesDevices)
     EXPECT_EQ(1U, controlSystem->GetEventNotification().Count());
 }
 
-TEST_F(Plugin, RegistersTheCameraProvidersInOrderAndStopTakesThemBack)
+TEST_F(Plugin, RegistersItsProvidersInOrderAndStopTakesThemBack)
 {
     plugin->Start(host);
 
-    ASSERT_EQ(1U, controlSystem->CommandProviders().size());
+    ASSERT_EQ(2U, controlSystem->CommandProviders().size());
     std::vector<std::wstring> commands;
-    controlSystem->CommandProviders()[0]->GetCommandNames(commands);
-    EXPECT_EQ(14U, commands.size());
-    EXPECT_EQ(L"CameraSettings_EnableStrobes", commands.front());
+    for (const auto& provider : controlSystem->CommandProviders()) {
+        provider->GetCommandNames(commands);
+    }
+    ASSERT_EQ(3U + 14U, commands.size());
+    EXPECT_EQ(L"System.Authorize", commands[0]);
+    EXPECT_EQ(L"System.Authorize.Cancel", commands[1]);
+    EXPECT_EQ(L"System.Heartbeat", commands[2]);
+    EXPECT_EQ(L"CameraSettings_EnableStrobes", commands[3]);
+    ASSERT_EQ(3U, controlSystem->EventProviders().size());
     std::vector<std::wstring> events;
     for (const auto& provider : controlSystem->EventProviders()) {
         provider->GetEventNames(events);
     }
     EXPECT_THAT(events,
-                ElementsAre(L"Event.Cameras.SelectionChanged", L"Event.Cameras.NameChanged",
+                ElementsAre(L"Event.Authorize", L"Event.Disconnect",
+                            L"Event.Cameras.SelectionChanged", L"Event.Cameras.NameChanged",
                             L"Event.Cameras.UserIdChanged", L"Event.Cameras.GreyscaleModeChanged",
                             L"Event.Cameras.SettingChanged", L"Event.Cameras.TapToSelectChanged"));
 
@@ -309,7 +204,7 @@ TEST_F(Plugin, ItsCommandsReachTheHostsTwoCameraSources)
     host.Settings->Add("Device", "qx:7").Add("StrobeIntensity", MakeDoubleValue(0.5));
     host.Selection->View->Selected = {VSelectionEntry("qx:3")};
     plugin->Start(host);
-    const auto provider = controlSystem->CommandProviders().at(0);
+    const auto provider = controlSystem->CommandProviders().at(1);
 
     ControlSystem::IParameters input, strobe, selection;
     input.Set(L"Param_CameraDeviceId", L"7");
@@ -353,7 +248,7 @@ TEST_F(Plugin, ChangesInTheHostsTwoCameraSourcesBecomeEventsUntilItIsDestroyed)
 
     strobe.Changed();
     host.Selection->Changed();
-    EXPECT_EQ("", device.ReadToEnd());
+    EXPECT_EQ(disconnect, device.ReadToEnd());
     EXPECT_EQ(0U, strobe.Changed.Count());
     EXPECT_EQ(0U, host.Selection->Changed.Count());
 }
@@ -436,16 +331,18 @@ TEST_F(Plugin, DestroyedItClosesEveryConnectionAndThePort)
     VRawClient idle(port);
     VRawClient withinAHeader(port);
     VRawClient withinAText(port);
+    for (VRawClient* const device : {&idle, &withinAHeader, &withinAText}) {
+        device->Request("<ServerInformation/>"); // the server has it on its list
+    }
     withinAHeader.Send("\x20\x00"s);
     withinAText.Send("\x20\x00\x00\x00<Serv"s);
-    idle.Request("<ServerInformation/>");
 
     plugin->Stop();
     Destroy(); // would hang if the socket waited for the pending reads
 
-    EXPECT_EQ("", idle.ReadToEnd());
-    EXPECT_EQ("", withinAHeader.ReadToEnd());
-    EXPECT_EQ("", withinAText.ReadToEnd());
+    EXPECT_EQ(disconnect, idle.ReadToEnd());
+    EXPECT_EQ(disconnect, withinAHeader.ReadToEnd());
+    EXPECT_EQ(disconnect, withinAText.ReadToEnd());
     EXPECT_EQ(0U, controlSystem->GetEventNotification().Count());
     EXPECT_TRUE(ComesTrue([&] { return controlSystem.use_count() == 2; })); // the test and its host
 }
@@ -458,6 +355,7 @@ TEST_F(Plugin, DestroyedWithoutStopItEndsAsWell)
 
     Destroy();
 
+    // The dispatcher still has the providers, and with them the authorization: nobody is told.
     EXPECT_EQ("", device.ReadToEnd());
 }
 

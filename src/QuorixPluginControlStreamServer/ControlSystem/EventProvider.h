@@ -24,8 +24,15 @@ protected:
     /// Publishes an event on the calling thread; whether anybody listens is not asked.
     void Publish(const std::wstring& name, const ControlSystem::IParameters& parameters) const
     {
-        if (controlSystem != nullptr) {
-            (void)controlSystem->FireEvent(name, parameters); // nobody could act on the result
+        PublishOn(controlSystem, name, parameters);
+    }
+
+    /// The same for a function that may outlive its provider, with a dispatcher that may be null.
+    static void PublishOn(IControlSystem* dispatcher, const std::wstring& name,
+                          const ControlSystem::IParameters& parameters)
+    {
+        if (dispatcher != nullptr) {
+            (void)dispatcher->FireEvent(name, parameters); // nobody could act on the result
         }
     }
 

@@ -46,6 +46,9 @@ TEST_F(CameraCommandsWire, AreListedBehindTheHostsOwn)
     EXPECT_EQ(declaration +
                   "<Correlation>7</Correlation><Commands><Command>Host.Information</Command>"
                   "<Command>Host.Echo</Command>"
+                  "<Command>System.Authorize</Command>"
+                  "<Command>System.Authorize.Cancel</Command>"
+                  "<Command>System.Heartbeat</Command>"
                   "<Command>CameraSettings_EnableStrobes</Command>"
                   "<Command>CameraSettings_DisableStrobes</Command>"
                   "<Command>CameraSettings_GetStrobeIntensity</Command>"
