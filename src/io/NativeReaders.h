@@ -33,10 +33,11 @@ inline void* PlaceOf(void* object, const IReaderCollapsable& part)
                : static_cast<unsigned char*>(object) + part.DestinationOffset;
 }
 
-/// True if elements of `size` bytes, one behind the other, are just the stored bytes.
-inline bool IsPacked(const IReaderCollapsable& element, std::size_t size)
+/// True if elements of `size` bytes, one behind the other, are just the stored bytes. A reader
+/// without a flat size is no packed element of no bytes: it may consume any number.
+inline bool IsPacked(const IReaderCollapsable& element, std::uint64_t size)
 {
-    return element.FlatSize == size && element.DestinationOffset == 0;
+    return element.FlatSize != 0 && element.FlatSize == size && element.DestinationOffset == 0;
 }
 
 /// Reads bytes that an object holds just as they are stored.
