@@ -1,0 +1,38 @@
+"""Makes texts from the network harmless for a terminal."""
+
+from __future__ import annotations
+
+_SHORT = {"\n": "\\n", "\r": "\\r", "\t": "\\t"}
+
+
+def _is_harmful(code: int) -> bool:
+    """Controls, separators of lines, and the marks that turn a direction around."""
+    return (
+        code < 0x20
+        or 0x7F <= code <= 0x9F
+        or code in (0x200E, 0x200F)
+        or 0x2028 <= code <= 0x202E
+        or 0x2066 <= code <= 0x2069
+    )
+
+
+def for_terminal(text: str) -> str:
+    shown = ""
+    for character in text:
+        code = ord(character)
+        if not _is_harmful(code):
+            shown += character
+        else:
+            shown += _SHORT.get(character) or (
+                f"\\x{code:02X}" if code < 0x100 else f"\\u{code:04X}"
+            )
+    return shown
+
+
+def word_for_terminal(text: str) -> str:
+    """In double quotes where the word would not stand out as one."""
+    shown = for_terminal(text)
+    if text and " " not in text and '"' not in text:
+        return shown
+    quoted = shown.replace('"', '\\"')
+    return f'"{quoted}"'

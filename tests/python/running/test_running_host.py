@@ -1,0 +1,174 @@
+import asyncio
+import time
+import unittest
+from typing import List
+
+from korva_control import (
+    AsyncClient,
+    BackOff,
+    Client,
+    ClientOptions,
+    ClosedError,
+    CommandReply,
+    Event,
+    ServerInformation,
+    State,
+    TimedOutError,
+)
+from quorix_host import LIMIT, QuorixHost
+
+CAMERA = {"Param_CameraDeviceId": "1"}
+OPTIONS = ClientOptions(time_limit=LIMIT)
+
+
+class RunningHost(unittest.TestCase):
+    def setUp(self) -> None:
+        self.host = QuorixHost()
+        self.addCleanup(self.host.__exit__)
+        self.client = Client(OPTIONS)
+        self.addCleanup(self.client.close)
+        self.client.connect("127.0.0.1")
+
+    def test_discovery(self) -> None:
+        self.assertEqual(ServerInformation(1, 0), self.client.server_information())
+        commands = self.client.commands()
+        self.assertEqual(["Host.Information", "Host.Echo"], commands[:2])
+        self.assertIn("CameraSettings_SetStrobeIntensity", commands)
+        self.assertIn("Event.Cameras.SettingChanged", self.client.events())
+
+        described = self.client.command_information("CameraSettings_GetTapEnabled")
+        self.assertEqual("Returns the current global Tap-To-Select setting", described.description)
+        self.assertEqual(["Param_TapEnabled"], [p.name for p in described.reply_parameters])
+        unknown = self.client.command_information("Host.Bogus")
+        self.assertEqual("Command not found.", unknown.description)
+        self.assertEqual("", self.client.event_information("Event.Cameras.NameChanged").name)
+
+    def test_a_strobe_and_the_event_that_it_causes(self) -> None:
+        with self.client.listen("Event.Cameras.SettingChanged") as events:
+            reply = self.client.execute(
+                "CameraSettings_SetStrobeIntensity", {**CAMERA, "Param_StrobeIntensity": "0.75"}
+            )
+            event = events.next(LIMIT)
+
+        self.assertEqual(CommandReply("OK", {}), reply)
+        self.assertEqual(
+            {"CameraId": "1", "SettingName": "StrobeIntensity", "SettingValue": "0.75"},
+            event.parameters,
+        )
+        self.assertEqual(0.75, self.host.state()["cameras"][0]["StrobeIntensity"])
+
+    def test_every_value_that_the_lint_lets_pass_arrives_as_it_was(self) -> None:
+        values = {
+            "markup": "<a b='c' d=\"e\">&amp;&lt;]]></a>",
+            "blanks": " a  b ",
+            "lines": "a\r\nb\tc",
+            "wide": "м一Р😀\u00a0\ufffd",
+            "empty": "",
+            "long": "x" * 100_000,
+            "na&me>'\"": "1",
+        }
+        self.assertEqual(values, self.client.execute("Host.Echo", values).parameters)
+
+    def test_what_the_lint_refuses_the_host_would_drop_or_change(self) -> None:
+        for request in (
+            b"<ExecuteCommand><Name>Host.Echo</Name><Correlation> </Correlation></ExecuteCommand>",
+            b"<ExecuteCommand><Name></Name><Correlation>1</Correlation></ExecuteCommand>",
+            b"<ExecuteCommand><Name>a<b</Name><Correlation>1</Correlation></ExecuteCommand>",
+            b"<EventInformation> </EventInformation>",
+        ):
+            with self.subTest(request=request), self.assertRaises(TimedOutError):
+                self.client.exchange_raw(request, 0.05)
+        echo = (
+            "<ExecuteCommand><Name>Host.Echo</Name><Correlation>raw</Correlation><Parameters>"
+            "<Parameter><Name>p</Name><Value>{}</Value></Parameter>{}</Parameters></ExecuteCommand>"
+        )
+        blank = self.client.exchange_raw(echo.format(" ", "").encode())
+        self.assertIn(b"<Value/>", blank)
+        twice = "<Parameter><Name>p</Name><Value>2</Value></Parameter>"
+        self.assertIn(
+            b"<Value>2</Value>", self.client.exchange_raw(echo.format("1", twice).encode())
+        )
+
+    def test_a_failure_in_the_host_s_words(self) -> None:
+        reply = self.client.execute("CameraSettings_GetGreyscaleMode", CAMERA)
+        self.assertEqual("Error: Unable to access requested data.", reply.result)
+        self.assertFalse(reply.ok)
+
+    def test_a_batch_of_ten_thousand_is_at_least_three_times_faster(self) -> None:
+        count = 10_000
+        commands = [("Host.Echo", {"n": str(number)}) for number in range(count)]
+        begin = time.perf_counter()
+        for name, parameters in commands[: count // 10]:
+            self.client.execute(name, parameters)
+        singly = (time.perf_counter() - begin) * 10
+        begin = time.perf_counter()
+        replies = self.client.execute_batch(commands)
+        together = time.perf_counter() - begin
+
+        self.assertEqual([c[1] for c in commands], [reply.parameters for reply in replies])
+        print(f"one at a time {singly:.2f} s, in a batch {together:.2f} s")
+        self.assertGreater(singly, 3 * together)
+
+    def test_handlers_hear_what_the_host_publishes(self) -> None:
+        heard: "List[Event]" = []
+        self.client.on("Event.A", heard.append)
+        with self.client.listen("Event.Last") as last:
+            self.host.command('fire Event.A Text="1 < 2"')
+            self.host.command("fire Event.B")
+            self.host.command("fire Event.A Text=3")
+            self.host.command("fire Event.Last")
+            last.next(LIMIT)
+            self.client.execute("Host.Echo")
+        self.client.close()
+        self.assertEqual(["1 < 2", "3"], [event.parameters["Text"] for event in heard])
+
+    def test_an_authorization_of_a_host_without_a_window(self) -> None:
+        outcome = self.client.authorize("desk-7", "Light desk")
+        self.assertTrue(outcome.granted)
+        self.assertEqual("300", outcome.server_version)
+        self.assertRegex(outcome.server_name, "^Quorix on ")
+        record = self.host.state()["control"]["desk-7"]
+        self.assertEqual("Light desk", record["Name"])
+        beat = self.client.execute("System.Heartbeat", {"BeatId": "x"})
+        self.assertEqual(CommandReply("OK", {"BeatId": "x"}), beat)
+
+        with Client(OPTIONS) as other:
+            other.connect("127.0.0.1")
+            self.assertEqual("Connected", other.authorize("desk-8", "Other desk").status)
+            other.cancel_authorization("desk-8")
+
+    def test_the_host_s_end_is_told(self) -> None:
+        with self.client.listen("Event.Disconnect") as goodbye:
+            self.assertEqual(0, self.host.quit())
+            self.assertEqual(Event("Event.Disconnect"), goodbye.next(LIMIT))
+            with self.assertRaises(ClosedError):
+                goodbye.next(LIMIT)
+        with self.assertRaises(ClosedError):
+            self.client.commands()
+
+
+class RestartedHost(unittest.IsolatedAsyncioTestCase):
+    async def test_is_connected_to_and_authorized_with_anew(self) -> None:
+        states: "asyncio.Queue[State]" = asyncio.Queue()
+        loop = asyncio.get_running_loop()
+
+        async def expect(state: State) -> None:
+            while await asyncio.wait_for(states.get(), LIMIT) is not state:
+                pass
+
+        options = ClientOptions(time_limit=LIMIT, reconnect=BackOff(first=0.01, longest=0.1))
+        async with AsyncClient(options) as client:
+            client.on_state(lambda state, text: states.put_nowait(state))
+            with await loop.run_in_executor(None, QuorixHost):
+                await client.connect("127.0.0.1")
+                self.assertTrue((await client.authorize("desk-7", "Light desk")).granted)
+                await expect(State.AUTHORIZED)
+            await expect(State.LOST)
+            with await loop.run_in_executor(None, QuorixHost) as host:
+                await expect(State.AUTHORIZED)
+                self.assertEqual("Light desk", host.state()["control"]["desk-7"]["Name"])
+                self.assertTrue((await client.execute("Host.Echo")).ok)
+
+
+if __name__ == "__main__":
+    unittest.main()

@@ -1,0 +1,99 @@
+"""A quorix-host process of a test, in the test's own network."""
+
+from __future__ import annotations
+
+import json
+import os
+import queue
+import subprocess
+import tempfile
+import threading
+from typing import Any, Dict, List, Sequence
+
+LIMIT = 60.0
+"""Seconds. Under a sanitizer, on a busy machine, a host may take long over what is done at once
+otherwise."""
+
+
+class QuorixHost:
+    """Runs the host that the environment names, and speaks to its console.
+
+    The data folder is the host's own, so that one test's operator is not remembered in another.
+    """
+
+    def __init__(self, arguments: Sequence[str] = (), launcher: Sequence[str] = ()) -> None:
+        self._folder = tempfile.TemporaryDirectory()
+        program = os.environ["QUORIX_HOST_PROGRAM"]
+        options = ["--headless", "--console", "--data", self._folder.name, *arguments]
+        self._process = subprocess.Popen(
+            [*launcher, program, *options],
+            stdin=subprocess.PIPE,
+            stdout=subprocess.PIPE,
+            stderr=subprocess.DEVNULL,
+            text=True,
+        )
+        self._lines: "queue.Queue[str]" = queue.Queue()
+        threading.Thread(target=self._read, daemon=True).start()
+        if self._next_line() != "ready":
+            self.kill()
+            raise RuntimeError("the host did not get ready")
+
+    def _read(self) -> None:
+        assert self._process.stdout is not None
+        for line in self._process.stdout:
+            self._lines.put(line.rstrip("\n"))
+        self._lines.put("(the host has ended)")
+
+    def _next_line(self) -> str:
+        return self._lines.get(timeout=LIMIT)
+
+    def command(self, line: str) -> str:
+        """Sends a line to the console and returns its answer."""
+        assert self._process.stdin is not None
+        self._process.stdin.write(line + "\n")
+        self._process.stdin.flush()
+        return self._next_line()
+
+    def state(self) -> Dict[str, Any]:
+        answer = self.command("state")
+        assert answer.startswith("ok "), answer
+        state: Dict[str, Any] = json.loads(answer[3:])
+        return state
+
+    def kill(self) -> None:
+        self._process.kill()
+        self._process.wait(LIMIT)
+        self._clean_up()
+
+    def quit(self) -> int:
+        """Stops the host in order. @return its exit code"""
+        self.command("quit")
+        code = self._process.wait(LIMIT)
+        self._clean_up()
+        return code
+
+    def _clean_up(self) -> None:
+        for pipe in (self._process.stdin, self._process.stdout):
+            assert pipe is not None
+            pipe.close()
+        self._folder.cleanup()
+
+    def __enter__(self) -> QuorixHost:
+        return self
+
+    def __exit__(self, *_details: object) -> None:
+        if self._process.poll() is None:
+            self.kill()
+
+
+def wait_for_lines(process: "subprocess.Popen[str]", count: int) -> List[str]:
+    """Reads so many lines of a process's standard output, each within the limit."""
+    lines: "queue.Queue[str]" = queue.Queue()
+
+    def read() -> None:
+        assert process.stdout is not None
+        for _ in range(count):
+            lines.put(process.stdout.readline().rstrip("\n"))
+
+    threading.Thread(target=read, daemon=True).start()
+    return [lines.get(timeout=LIMIT) for _ in range(count)]
