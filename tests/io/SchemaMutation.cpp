@@ -25,7 +25,7 @@ void VSchemaMutation::ChangeReadably(ISchema& schema)
     }
     if (IsEnumType(schema.Type)) {
         ChangeEnum(schema);
-    } else if (schema.Type <= EType::Float64 && Chance(2)) {
+    } else if (schema.Type != EType::Void && schema.Type <= EType::Float64 && Chance(2)) {
         WidenNumber(schema);
     }
     for (ISchema::SubSchema& part : schema.SubSchemas) {
@@ -62,7 +62,7 @@ void VSchemaMutation::ChangeEnum(ISchema& schema)
     const bool renumber = schema.Type == EType::Enum32 && Chance(2);
     for (ISchema::EnumValue& entry : entries) {
         if (renumber) {
-            entry.second += 7;
+            entry.second = static_cast<std::int32_t>(static_cast<std::uint32_t>(entry.second) + 7);
         }
         if (Chance(3)) {
             entry.first = "LEGACY_" + entry.first;
@@ -94,7 +94,7 @@ void VSchemaMutation::ChangeAnything(ISchema& schema)
         ChangeAnything(schema.SubSchemas[part].second);
     } else if (schema.Type == EType::Array && Chance(2)) {
         ++schema.Count;
-    } else if (IsEnumType(schema.Type) && Chance(2)) {
+    } else if (IsEnumType(schema.Type) && !schema.EnumValues.empty() && Chance(2)) {
         schema.EnumValues.pop_back();
     } else {
         schema = random.MakeSchema(2, {});
