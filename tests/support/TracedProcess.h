@@ -44,16 +44,15 @@ public:
     VTracedProcess(const VTracedProcess&) = delete;
     VTracedProcess& operator=(const VTracedProcess&) = delete;
 
-    /// Runs to the next entry of a system call or return from one. @return false at the end
+    /// Runs to the next entry of a system call or return from one; those that only fetch random
+    /// numbers, of which there may be thousands, change nothing and are passed over.
+    ///
+    /// @return false at the end
     bool Step()
     {
         do {
-            if (ptrace(PTRACE_SYSCALL, child, nullptr, nullptr) != 0) {
-                throw std::runtime_error("cannot trace");
-            }
-            AwaitStop();
-        } while (!ended && WSTOPSIG(status) != (SIGTRAP | 0x80));
-        entered = !entered;
+            RunToStop();
+        } while (!ended && IsHarmless());
         return !ended;
     }
 
@@ -113,6 +112,26 @@ private:
             ptrace(PTRACE_PEEKDATA, child, LengthOfLastPiece(registers), nullptr));
     }
 #endif
+
+    void RunToStop()
+    {
+        do {
+            if (ptrace(PTRACE_SYSCALL, child, nullptr, nullptr) != 0) {
+                throw std::runtime_error("cannot trace");
+            }
+            AwaitStop();
+        } while (!ended && WSTOPSIG(status) != (SIGTRAP | 0x80));
+        entered = !entered;
+    }
+
+    bool IsHarmless() const
+    {
+#ifdef __x86_64__
+        return Registers().orig_rax == SYS_getrandom;
+#else
+        return false;
+#endif
+    }
 
     void AwaitStop()
     {
