@@ -8,7 +8,7 @@ import queue
 import subprocess
 import tempfile
 import threading
-from typing import Any, Dict, List, Sequence
+from typing import Any, Dict, List, Optional, Sequence
 
 LIMIT = 60.0
 """Seconds. Under a sanitizer, on a busy machine, a host may take long over what is done at once
@@ -16,14 +16,19 @@ otherwise."""
 
 
 class QuorixHost:
-    """Runs the host that the environment names, and speaks to its console.
+    """Runs a host, by default the one that the environment names, and speaks to its console.
 
     The data folder is the host's own, so that one test's operator is not remembered in another.
     """
 
-    def __init__(self, arguments: Sequence[str] = (), launcher: Sequence[str] = ()) -> None:
+    def __init__(
+        self,
+        arguments: Sequence[str] = (),
+        launcher: Sequence[str] = (),
+        program: Optional[str] = None,
+    ) -> None:
         self._folder = tempfile.TemporaryDirectory()
-        program = os.environ["QUORIX_HOST_PROGRAM"]
+        program = program or os.environ["QUORIX_HOST_PROGRAM"]
         options = ["--headless", "--console", "--data", self._folder.name, *arguments]
         self._process = subprocess.Popen(
             [*launcher, program, *options],
