@@ -3,6 +3,7 @@
 std::vector<std::unique_ptr<ICommand>> MakeCommands()
 {
     std::vector<std::unique_ptr<ICommand>> commands;
+    commands.push_back(MakeCommandDiscover());
     commands.push_back(MakeCommandInfo());
     commands.push_back(MakeCommandCameras());
     commands.push_back(MakeCommandCommands());
@@ -12,5 +13,6 @@ std::vector<std::unique_ptr<ICommand>> MakeCommands()
     commands.push_back(MakeCommandRun());
     commands.push_back(MakeCommandWatch());
     commands.push_back(MakeCommandRaw());
+    commands.push_back(MakeCommandDoctor());
     return commands;
 }

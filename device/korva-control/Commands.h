@@ -8,6 +8,7 @@
 /// Makes all commands, in the order in which the help shows them.
 std::vector<std::unique_ptr<ICommand>> MakeCommands();
 
+std::unique_ptr<ICommand> MakeCommandDiscover();
 std::unique_ptr<ICommand> MakeCommandInfo();
 std::unique_ptr<ICommand> MakeCommandCameras();
 std::unique_ptr<ICommand> MakeCommandCommands();
@@ -17,3 +18,4 @@ std::unique_ptr<ICommand> MakeCommandDescribeEvent();
 std::unique_ptr<ICommand> MakeCommandRun();
 std::unique_ptr<ICommand> MakeCommandWatch();
 std::unique_ptr<ICommand> MakeCommandRaw();
+std::unique_ptr<ICommand> MakeCommandDoctor();

@@ -50,7 +50,9 @@ std::string CheckSeconds(const std::string& text)
 void AddOptions(CLI::App& program, VSessionOptions& options)
 {
     program.set_version_flag("--version", "korva-control " QUORIX_VERSION);
-    program.add_option("--host", options.Host, "The host's name or IPv4 address")
+    program
+        .add_option("--host", options.Host,
+                    "The host's name or IPv4 address, or the name under which it advertises itself")
         ->transform(&PlainWord)
         ->capture_default_str();
     program.add_option("--port", options.Port, "The port on which the host listens")
@@ -106,6 +108,7 @@ EExitCode Run(int argc, char** argv)
     } catch (const CLI::ParseError& error) {
         return program.exit(error) == 0 ? EExitCode::Done : EExitCode::WrongUsage;
     }
+    options.IsHostGiven = program.count("--host") > 0;
     for (std::size_t i = 0; i < commands.size(); ++i) {
         if (chosen[i]->parsed()) {
             return RunGuarded(*commands[i], options);

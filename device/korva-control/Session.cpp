@@ -1,5 +1,6 @@
 #include "korva-control/Session.h"
 
+#include "ControlStreamClient/Discovery.h"
 #include "korva-control/TerminalText.h"
 
 #include <cmath>
@@ -20,9 +21,17 @@ VSession::VSession(const VSessionOptions& sessionOptions)
 ControlStream::VClient& VSession::Connect()
 {
     if (!client.IsConnected()) {
-        client.Connect(options.Host, options.Port, TimeLimit());
+        client.Connect(HostAddress(), options.Port, TimeLimit());
     }
     return client;
+}
+
+const std::string& VSession::HostAddress()
+{
+    if (hostAddress.empty()) {
+        hostAddress = ControlStream::FindHost(options.Host, TimeLimit());
+    }
+    return hostAddress;
 }
 
 std::chrono::milliseconds VSession::TimeLimit() const

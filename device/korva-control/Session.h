@@ -12,6 +12,7 @@
 struct VSessionOptions
 {
     std::string Host = "127.0.0.1";
+    bool IsHostGiven = false; ///< whether the user named the host
     std::uint16_t Port = ControlStream::DefaultPort;
     bool Json = false;
     std::optional<double> Timeout; ///< seconds, as given; empty where it was not
@@ -31,6 +32,12 @@ public:
 
     VOutput& Output() { return output; }
 
+    const VSessionOptions& Options() const { return options; }
+
+    /// Returns the host in a form that can be connected to, looking once for the host that
+    /// advertises itself under a name which is no host's name.
+    const std::string& HostAddress();
+
     /// How long a connection or a request may take.
     std::chrono::milliseconds TimeLimit() const;
 
@@ -42,6 +49,7 @@ public:
 
 private:
     const VSessionOptions options;
+    std::string hostAddress; // empty until it was needed
     VOutput output;
     ControlStream::VClient client;
 };
