@@ -1,7 +1,9 @@
 #include "QuorixPluginControlStreamServer/QuorixPluginControlStreamServer.h"
 
 #include "NSDBonjour/BonjourRegistrar.h"
+#include "QuorixPluginControlStreamServer/Authorization/ControlPanel.h"
 #include "QuorixPluginControlStreamServer/Authorization/QuorixControlAuthorization.h"
+#include "QuorixPluginControlStreamServer/Authorization/QuorixControlAuthorizationGUI.h"
 #include "QuorixPluginControlStreamServer/ControlStreamServer/Server.h"
 #include "QuorixPluginControlStreamServer/ControlStreamServer/SocketASIO.h"
 #include "QuorixPluginControlStreamServer/ControlSystem/CommandProviderAuthorization.h"
@@ -11,6 +13,7 @@
 #include "QuorixPluginControlStreamServer/ControlSystem/EventProviderCameraSettings.h"
 #include "QuorixPluginControlStreamServer/ControlSystem/IControlSystem.h"
 #include "QuorixPluginInterface/IHost.h"
+#include "QuorixPluginInterface/IQuorixGUI.h"
 #include "notification/MakeShared.h"
 
 #include <boost/asio/ip/host_name.hpp>
@@ -55,7 +58,7 @@ void VQuorixPluginControlStreamServer::BuildAuthorizationAndProviders(
     commandProviders.push_back(
         std::make_shared<VCommandProviderCameraSettings>(selection, settings));
     eventProviders.push_back(
-        std::make_shared<VEventProviderAuthorized>(controlSystem.get(), authorization));
+        std::make_shared<VEventProviderAuthorized>(controlSystem, authorization));
     eventProviders.push_back(
         KVR::MakeShared<VEventProviderCameraSelection>(controlSystem.get(), selection));
     eventProviders.push_back(
@@ -96,9 +99,12 @@ void VQuorixPluginControlStreamServer::Advertise()
     // registrar is never deleted, as its end would withdraw the advertisement.
 }
 
-bool VQuorixPluginControlStreamServer::InitialiseGUI(QuorixPluginInterface::IHost& /*host*/,
-                                                     IQuorixGUI& /*gui*/)
+bool VQuorixPluginControlStreamServer::InitialiseGUI(QuorixPluginInterface::IHost& host,
+                                                     IQuorixGUI& gui)
 {
+    authorizationGUI = KVR::MakeShared<VQuorixControlAuthorizationGUI>(
+        gui.GetQuickContext(), authorization, host.GetStore(), nullptr);
+    AddControlPanel(gui, authorization);
     return true;
 }
 

@@ -84,7 +84,7 @@ std::size_t SlotOf(TOperation operation)
 
 TEST(PluginLibrary, ExportsItsTwoFunctionsAndNothingElse)
 {
-    FILE* const table = popen("nm -D --defined-only " QUORIX_PLUGIN_LIBRARY, "r");
+    FILE* const table = popen("nm -D --extern-only --defined-only " QUORIX_PLUGIN_LIBRARY, "r");
     ASSERT_NE(nullptr, table);
     std::vector<std::string> names;
     char address[64] = {}, kind[8] = {}, name[1024] = {};
