@@ -70,6 +70,7 @@ void VControlSystem::ExecuteCommand(
 {
     ControlSystem::IParameters reply;
     const ControlSystem::IResult result = RunCommand(name, input, reply);
+    CallGuarded("the notification of commands", [&] { commandNotification(name); });
     if (result.Code == resultOk) {
         success(reply);
     } else {
@@ -91,6 +92,11 @@ ControlSystem::IResult VControlSystem::RunCommand(const std::wstring& name,
         result.Code = resultSystemError;
     }
     return result;
+}
+
+KVR::IMultiCallback<void(const std::wstring&)>& VControlSystem::GetCommandNotification()
+{
+    return commandNotification;
 }
 
 void VControlSystem::AddEventProvider(std::shared_ptr<ControlSystem::IEventProvider> provider)

@@ -2,6 +2,7 @@
 
 #include "ProviderList.h"
 #include "QuorixPluginControlStreamServer/ControlSystem/IControlSystem.h"
+#include "notification/MultiCallback.h"
 #include "notification/MultiCallbackPostal.h"
 
 #include <memory>
@@ -50,6 +51,10 @@ public:
     ControlSystem::IResult FireEvent(const std::wstring& name,
                                      const ControlSystem::IParameters& parameters) override;
 
+    /// Fires with a command's name after it has run, on its thread and before its reply is known.
+    /// What a function throws is logged.
+    KVR::IMultiCallback<void(const std::wstring&)>& GetCommandNotification();
+
 private:
     ControlSystem::IResult RunCommand(const std::wstring& name,
                                       const ControlSystem::IParameters& input,
@@ -57,6 +62,7 @@ private:
 
     VProviderList<ControlSystem::ICommandProvider> commandProviders;
     VProviderList<ControlSystem::IEventProvider> eventProviders;
+    NotificationSystem::VMultiCallback<void(const std::wstring&)> commandNotification;
     NotificationSystem::VMultiCallbackPostal<void(const std::wstring&,
                                                   const ControlSystem::IParameters&)>
         eventNotification; // no default service: listeners run on the thread that fires

@@ -33,6 +33,9 @@ public:
     /// Returns the cameras, for who handles them on the user's behalf.
     const VCameraServices& Cameras() const { return cameras; }
 
+    /// Returns the dispatcher, for who watches what runs through it.
+    const std::shared_ptr<VControlSystem>& Dispatcher() const { return controlSystem; }
+
     /// Ends the cameras' hardware, and what is delivered on the event loop, once the loop and the
     /// plug-in have gone. A second call does nothing.
     void Close();

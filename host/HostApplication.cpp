@@ -48,13 +48,16 @@ void PrepareDataFolder(const std::string& folder)
 
 } // namespace
 
-VHostApplication::VHostApplication(VOptions options)
+VHostApplication::VHostApplication(VOptions options, const VMakeHostWindow& makeWindow)
     : options(std::move(options)),
-      quit(&QCoreApplication::quit),
+      quit([this] { RequestEnd(); }),
       orderlyStop([this] { quit.Wake(); }, [] { return DescribeStalledPeers(controlStreamPort); },
                   stopPatience),
       host(this->options.cameras)
 {
+    if (makeWindow) {
+        window = makeWindow(host, [this] { orderlyStop.Request(); });
+    }
 }
 
 VHostApplication::~VHostApplication() = default;
@@ -68,6 +71,7 @@ int VHostApplication::Run()
         Serve();
         StopPlugin();
     }
+    window.reset();
     host.Close();
     if (!AwaitEndOfOtherThreads(ownThreads, leftThreadLimit)) {
         KVR_LOG("Host", 6, "The plug-in has left threads behind");
@@ -82,11 +86,23 @@ int VHostApplication::Run()
 void VHostApplication::Serve()
 {
     ReportPort();
+    if (window) {
+        window->Show();
+    }
     if (options.console) {
         OpenConsole();
     }
     QCoreApplication::exec();
     consoleStream.reset();
+}
+
+void VHostApplication::RequestEnd()
+{
+    // The loop of an open dialog ends together with the outermost one, but without an answer.
+    if (window) {
+        window->EndDialogs();
+    }
+    QCoreApplication::quit();
 }
 
 bool VHostApplication::StartPlugin()
@@ -102,6 +118,7 @@ bool VHostApplication::StartPlugin()
         plugin = std::make_unique<VPlugin>(path);
         KVR_LOG("Host", 4, "Loaded the plug-in %1%", path);
         if ((*plugin)->Start(host)) {
+            StartPluginGUI();
             // Only what is reported from now on is heard of by the plug-in.
             host.Cameras().cameras->ReportDevices();
             return true;
@@ -112,6 +129,13 @@ bool VHostApplication::StartPlugin()
     }
     plugin.reset();
     return false;
+}
+
+void VHostApplication::StartPluginGUI()
+{
+    if (window && !(*plugin)->InitialiseGUI(host, window->GUI())) {
+        KVR_LOG("Host", 3, "The plug-in adds nothing to the window");
+    }
 }
 
 void VHostApplication::ReportPort() const
@@ -134,6 +158,9 @@ void VHostApplication::OpenConsole()
     });
     AddCameraCommands(console, host.Cameras());
     AddCameraState(console, host.Cameras());
+    if (window) {
+        window->AddToConsole(console);
+    }
 
     consoleStream = std::make_unique<VConsoleStream>(console, STDIN_FILENO, STDOUT_FILENO);
     consoleStream->WriteLine("ready");
@@ -141,6 +168,9 @@ void VHostApplication::OpenConsole()
 
 void VHostApplication::StopPlugin()
 {
+    if (window) {
+        window->ClosePanels(); // they hold what the plug-in must be the last to let go of
+    }
     (*plugin)->Stop();
     plugin.reset();
 }

@@ -2,6 +2,7 @@
 
 #include "Console.h"
 #include "Host.h"
+#include "IHostWindow.h"
 #include "MainThreadWakeUp.h"
 #include "Options.h"
 #include "OrderlyStop.h"
@@ -20,8 +21,12 @@ class VPlugin;
 class VHostApplication
 {
 public:
-    /// Needs a QCoreApplication, and that no thread has been made yet.
-    explicit VHostApplication(VOptions options);
+    /// Needs a QCoreApplication, a QApplication for a window, and that no thread has been made yet
+    /// but Qt's, with SIGINT and SIGTERM blocked.
+    ///
+    /// @param makeWindow  empty for a host without a window
+    explicit VHostApplication(VOptions options,
+                              const VMakeHostWindow& makeWindow = VMakeHostWindow());
     ~VHostApplication();
 
     VHostApplication(const VHostApplication&) = delete;
@@ -34,7 +39,9 @@ public:
     int Run();
 
 private:
+    void RequestEnd();
     bool StartPlugin();
+    void StartPluginGUI();
     void Serve();
     void ReportPort() const;
     void OpenConsole();
@@ -44,6 +51,7 @@ private:
     VMainThreadWakeUp quit; // outlives the thread of orderlyStop, which wakes it
     VOrderlyStop orderlyStop;
     VHost host;
+    std::unique_ptr<IHostWindow> window; // null without one
     VConsole console;
     std::unique_ptr<VConsoleStream> consoleStream;
     std::unique_ptr<VPlugin> plugin; // goes before the services that it uses

@@ -4,8 +4,11 @@
 #include "Options.h"
 #include "QuorixVersion.h"
 #include "utils/LogStatement.h"
+#include "window/HostWindow.h"
+#include "window/WindowLog.h"
 
-#include <QCoreApplication>
+#include <QApplication>
+#include <QQuickWindow>
 
 #include <csignal>
 #include <exception>
@@ -13,18 +16,60 @@
 
 namespace {
 
-int RunHost(const QuorixHost::VOptions& options)
+constexpr int noDisplayExitCode = 1;
+
+/// Tells whether a window could come up. Qt would end the process without a display.
+bool HasDisplay()
 {
-    if (!options.headless) {
-        KVR_LOG("Host", 3, "This host has no window: it runs as with --headless");
-    }
+    return qEnvironmentVariableIsSet("QT_QPA_PLATFORM") ||
+           !qEnvironmentVariableIsEmpty("DISPLAY") ||
+           !qEnvironmentVariableIsEmpty("WAYLAND_DISPLAY");
+}
+
+/// Has Qt's own threads leave the signals to the thread that waits for them.
+void BlockStopSignals()
+{
+    sigset_t stopSignals;
+    sigemptyset(&stopSignals);
+    sigaddset(&stopSignals, SIGINT);
+    sigaddset(&stopSignals, SIGTERM);
+    pthread_sigmask(SIG_BLOCK, &stopSignals, nullptr);
+}
+
+int RunHost(const QuorixHost::VOptions& options, const QuorixHost::VMakeHostWindow& makeWindow)
+{
+    QCoreApplication::setApplicationName("Quorix");
+    QCoreApplication::setApplicationVersion(QUORIX_VERSION);
     try {
-        QuorixHost::VHostApplication host(options);
+        QuorixHost::VHostApplication host(options, makeWindow);
         return host.Run();
     } catch (const std::exception& exception) {
         KVR_LOG("Host", 2, "The host failed: %1%", exception.what());
         return 1;
     }
+}
+
+int RunWithoutWindow(const QuorixHost::VOptions& options, int& argumentCount, char** arguments)
+{
+    const QCoreApplication application(argumentCount, arguments);
+    return RunHost(options, QuorixHost::VMakeHostWindow());
+}
+
+int RunWithWindow(const QuorixHost::VOptions& options, int& argumentCount, char** arguments)
+{
+    if (!HasDisplay()) {
+        KVR_LOG("Host", 2, "There is no display for a window. Run with --headless to do without");
+        return noDisplayExitCode;
+    }
+    BlockStopSignals();
+    QuorixHost::VWindowLog::Installed(); // from the first line on
+    QApplication::setStyle("Fusion");    // the one style that follows every palette
+    const QApplication application(argumentCount, arguments);
+    QApplication::setQuitOnLastWindowClosed(false); // the host stops in order
+    if (QGuiApplication::platformName() == "offscreen") {
+        QQuickWindow::setSceneGraphBackend(QSGRendererInterface::Software); // it has no OpenGL
+    }
+    return RunHost(options, &QuorixHost::MakeHostWindow);
 }
 
 } // namespace
@@ -44,10 +89,8 @@ int main(int argumentCount, char** arguments)
         DebugServices::SetLogLevel(category, level);
     }
 
+    const QuorixHost::VOptions& options = *commandLine.options;
     int qtArgumentCount = 1; // the options are the host's own
-    const QCoreApplication application(qtArgumentCount, arguments);
-    QCoreApplication::setApplicationName("Quorix");
-    QCoreApplication::setApplicationVersion(QUORIX_VERSION);
-
-    return RunHost(*commandLine.options);
+    return options.headless ? RunWithoutWindow(options, qtArgumentCount, arguments)
+                            : RunWithWindow(options, qtArgumentCount, arguments);
 }

@@ -166,11 +166,15 @@ TEST(HostOptions, LogLevelsCount)
     EXPECT_EQ("", quiet.Errors());
 }
 
-TEST(HostOptions, WithoutAWindowItSaysThatThereIsNone)
+TEST(HostOptions, WithoutADisplayAWindowEndsWith1)
 {
-    VRunningHost host({"--console"});
-    TestSupport::ExpectOrderlyEnd(host);
-    EXPECT_THAT(host.Errors(), HasSubstr("runs as with --headless"));
+    VHostProcess host({"--console"},
+                      {"env", "-u", "DISPLAY", "-u", "WAYLAND_DISPLAY", "-u", "QT_QPA_PLATFORM"});
+
+    EXPECT_EQ(1, host.WaitExit().value_or(-1));
+
+    EXPECT_THAT(host.Errors(), HasSubstr("There is no display for a window"));
+    EXPECT_THAT(host.Errors(), HasSubstr("--headless"));
 }
 
 TEST(HostOptions, AMissingPluginEndsWith1)
