@@ -59,20 +59,34 @@ bool BelongsToTagName(wchar_t unit)
            (unit >= L'A' && unit <= L'Z') || (unit >= L'a' && unit <= L'z');
 }
 
+/// Returns the length of the comment that begins here, without its end; 0 where none does.
+std::size_t CommentLength(const std::wstring& text, std::size_t begin)
+{
+    if (text.compare(begin, 4, L"<!--") != 0) {
+        return 0;
+    }
+    const std::size_t end = text.find(L"-->", begin);
+    return (end == std::wstring::npos ? text.size() : end) - begin;
+}
+
 /// Returns the text with each tag cut down to its name: a link asks for the colours of windows, and
 /// a process without any would crash.
 std::wstring WithoutAttributes(const std::wstring& text)
 {
     std::wstring result;
-    auto position = text.begin();
-    while (position != text.end()) {
-        const auto tag = std::find(position, text.end(), L'<');
-        result.append(position, tag);
-        const auto close = std::find(tag, text.end(), L'>');
-        if (tag != text.end()) {
-            result += L'<';
-            result.append(tag + 1, std::find_if_not(tag + 1, close, &BelongsToTagName));
+    for (std::size_t position = 0; position < text.size();) {
+        const std::size_t tag = std::min(text.find(L'<', position), text.size());
+        result.append(text, position, tag - position);
+        if (const std::size_t comment = CommentLength(text, tag)) {
+            result.append(text, tag, comment);
+            position = tag + comment;
+            continue;
         }
+        const std::size_t close = std::min(text.find(L'>', tag), text.size());
+        const auto name = text.begin() + static_cast<std::ptrdiff_t>(std::min(tag + 1, close));
+        const auto end = text.begin() + static_cast<std::ptrdiff_t>(close);
+        result.append(text, tag, tag < close ? 1 : 0);
+        result.append(name, std::find_if_not(name, end, &BelongsToTagName));
         position = close; // which is copied with the text behind it
     }
     return result;
