@@ -6,10 +6,12 @@
 #include "ControlSystem.h"
 #include "FileLimit.h"
 #include "HostCommandProvider.h"
+#include "HostFolders.h"
 #include "LeftThreads.h"
 #include "Plugin.h"
 #include "PortCheck.h"
 #include "QuorixPluginInterface/IPlugin.h"
+#include "QuorixPreferences/Preferences.h"
 #include "StalledPeers.h"
 #include "cameras/SimulatedCameras.h"
 #include "utils/LogStatement.h"
@@ -17,7 +19,6 @@
 #include <QCoreApplication>
 
 #include <exception>
-#include <filesystem>
 #include <unistd.h>
 #include <utility>
 
@@ -35,15 +36,25 @@ constexpr std::chrono::milliseconds stopPatience{5000};
 // How long a thread that the plug-in left behind may take to end. One that never ends is harmless.
 constexpr std::chrono::milliseconds leftThreadLimit{1000};
 
-/// Makes the folder given for the host's files. Throws std::runtime_error where it cannot be used.
-void PrepareDataFolder(const std::string& folder)
+/// Finds or makes the host's folders. Where none was asked for, a host runs without any too.
+///
+/// @return null where the host has to do without; throws where the folder that was asked for
+/// cannot be used
+std::unique_ptr<VHostFolders> PrepareFolders(const std::string& wanted)
 {
-    std::error_code error;
-    std::filesystem::create_directories(folder, error);
-    if (error || !std::filesystem::is_directory(folder, error) ||
-        access(folder.c_str(), W_OK | X_OK) != 0) {
-        throw std::runtime_error("the data folder " + folder + " cannot be made or written to");
+    if (!wanted.empty()) {
+        return std::make_unique<VHostFolders>(wanted);
     }
+    const std::string folder = DefaultDataFolder();
+    try {
+        if (!folder.empty()) {
+            return std::make_unique<VHostFolders>(folder);
+        }
+        KVR_LOG("Host", 3, "There is no home folder: preferences are not kept");
+    } catch (const std::exception& exception) {
+        KVR_LOG("Host", 3, "Preferences are not kept: %1%", exception.what());
+    }
+    return nullptr;
 }
 
 } // namespace
@@ -70,6 +81,10 @@ int VHostApplication::Run()
     if (started) {
         Serve();
         StopPlugin();
+        if (folders != nullptr) {
+            // After the plug-in has gone, which writes its lists then.
+            SavePreferences(*host.GetStore(), *folders);
+        }
     }
     window.reset();
     host.Close();
@@ -108,8 +123,10 @@ void VHostApplication::RequestEnd()
 bool VHostApplication::StartPlugin()
 {
     try {
-        if (!options.dataFolder.empty()) {
-            PrepareDataFolder(options.dataFolder);
+        // Before the plug-in is made, which reads its lists then.
+        folders = PrepareFolders(options.dataFolder);
+        if (folders != nullptr) {
+            LoadPreferences(*host.GetStore(), *folders);
         }
         host.GetControlSystem()->AddCommandProvider(std::make_shared<VHostCommandProvider>(
             [cameras = host.Cameras().cameras] { return cameras->CameraNumbers(); }));
@@ -152,6 +169,7 @@ void VHostApplication::ReportPort() const
 void VHostApplication::OpenConsole()
 {
     AddEventCommands(console, host.GetControlSystem());
+    AddClockCommand(console);
     AddStopCommand(console, [this] {
         consoleStream->End();
         orderlyStop.Request();
