@@ -53,6 +53,7 @@ class Device:
 
     def __init__(self) -> None:
         self._socket = socket.create_connection(("127.0.0.1", 803), LIMIT)
+        self._socket.setsockopt(socket.IPPROTO_TCP, socket.TCP_NODELAY, 1)
         self._events: List[Frame] = []
         self.exchange(SERVER_INFORMATION)  # a host that answers has entered it among its devices
 
@@ -62,8 +63,11 @@ class Device:
     def send(self, text: str) -> Frame:
         body = text.encode()
         frame = Frame(struct.pack("<I", len(body)), body)
-        self._socket.sendall(frame.header + frame.body)
+        self.send_bytes(frame.header + frame.body)
         return frame
+
+    def send_bytes(self, data: bytes) -> None:
+        self._socket.sendall(data)
 
     def _read(self, count: int) -> bytes:
         data = b""
