@@ -37,5 +37,6 @@ std::unique_ptr<ICommand> MakeGetCommand();
 std::unique_ptr<ICommand> MakeSetCommand();
 std::unique_ptr<ICommand> MakeListCommand();
 std::unique_ptr<ICommand> MakeDiffCommand();
+std::unique_ptr<ICommand> MakeMigrateCommand();
 
 } // namespace QuorixConfig

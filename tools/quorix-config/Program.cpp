@@ -44,6 +44,7 @@ std::vector<std::unique_ptr<ICommand>> MakeCommands()
     commands.push_back(MakeSetCommand());
     commands.push_back(MakeListCommand());
     commands.push_back(MakeDiffCommand());
+    commands.push_back(MakeMigrateCommand());
     return commands;
 }
 
