@@ -12,6 +12,7 @@
 namespace QuorixHost {
 
 class VConsoleStream;
+class VHostFolders;
 class VPlugin;
 
 /// The host from its first service to its last: starts the plug-in, serves until it is asked to
@@ -50,6 +51,7 @@ private:
     const VOptions options;
     VMainThreadWakeUp quit; // outlives the thread of orderlyStop, which wakes it
     VOrderlyStop orderlyStop;
+    std::unique_ptr<VHostFolders> folders; // null where no preferences are kept
     VHost host;
     std::unique_ptr<IHostWindow> window; // null without one
     VConsole console;

@@ -85,7 +85,8 @@ VCommandLine ParseCommandLine(int argumentCount, const char* const* arguments, s
     application.add_flag("--headless", options.headless, "No window")->disable_flag_override();
     application
         .add_option("--data", options.dataFolder,
-                    "Folder of the host's files, made where it is missing")
+                    "Folder of the host's files, made where it is missing; default: quorix in the "
+                    "user's data folder")
         ->type_name("PATH")
         ->check(notEmpty);
     application

@@ -1,5 +1,6 @@
 #pragma once
 
+#include "support/TemporaryFolder.h"
 #include "utils/Mutex.h"
 
 #include <cerrno>
@@ -7,12 +8,14 @@
 #include <condition_variable>
 #include <csignal>
 #include <cstddef>
+#include <cstring>
 #include <fcntl.h>
 #include <optional>
 #include <poll.h>
 #include <stdexcept>
 #include <string>
 #include <sys/prctl.h>
+#include <sys/stat.h>
 #include <sys/syscall.h>
 #include <sys/wait.h>
 #include <thread>
@@ -258,6 +261,21 @@ private:
         int ends[2] = {-1, -1}; // to read from, to write to
     };
 
+    /// Returns the test's environment with a data folder of the host's own, so that nothing that
+    /// one host remembers is met by another. Anybody may write to it, as a host may be another
+    /// user.
+    std::vector<std::string> Environment() const
+    {
+        chmod(dataHome.Path().c_str(), 0777);
+        std::vector<std::string> settings{"XDG_DATA_HOME=" + dataHome.Path()};
+        for (char** setting = environ; *setting != nullptr; ++setting) {
+            if (std::strncmp(*setting, "XDG_DATA_HOME=", 14) != 0) {
+                settings.emplace_back(*setting);
+            }
+        }
+        return settings;
+    }
+
     void Spawn(std::vector<std::string>& words)
     {
         std::vector<char*> arguments;
@@ -265,6 +283,12 @@ private:
             arguments.push_back(word.data());
         }
         arguments.push_back(nullptr);
+        const std::vector<std::string> settings = Environment();
+        std::vector<char*> environment;
+        for (const std::string& setting : settings) {
+            environment.push_back(const_cast<char*>(setting.data())); // as the call has it
+        }
+        environment.push_back(nullptr);
         const VPipe inputPipe, outputPipe, errorPipe;
 
         pid = fork();
@@ -274,7 +298,7 @@ private:
             dup2(inputPipe.ends[0], STDIN_FILENO);
             dup2(outputPipe.ends[1], STDOUT_FILENO);
             dup2(errorPipe.ends[1], STDERR_FILENO);
-            execvp(arguments[0], arguments.data());
+            execvpe(arguments[0], arguments.data(), environment.data());
             _exit(127);
         }
         if (pid < 0) {
@@ -292,6 +316,7 @@ private:
         errors.emplace(errorPipe.ends[0]);
     }
 
+    const VTemporaryFolder dataHome; // gone after the process
     pid_t pid = -1;
     int processDescriptor = -1; // becomes readable when the process ends
     int input = -1;
