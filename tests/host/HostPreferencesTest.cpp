@@ -1,5 +1,6 @@
 #include "HostFolders.h"
 #include "RunningHost.h"
+#include "cameras/WireDevice.h"
 #include "support/TemporaryFolder.h"
 
 #include <gmock/gmock.h>
@@ -62,6 +63,26 @@ std::string RunOnce(const std::string& dataFolder)
     EXPECT_EQ(host.Command("quit"), "ok");
     EXPECT_EQ(host.WaitExit().value_or(-1), 0) << host.Errors();
     return host.Errors();
+}
+
+/// Sends a device's request to be let in. @return the reply
+std::string Authorize(CameraTest::VWireDevice& device, const std::string& id)
+{
+    return device.Run("System.Authorize", {{"DeviceId", id}, {"DeviceName", "Device"}});
+}
+
+/// Has a new device ask, and the operator answer once the dialog is open.
+void AskAndAnswer(VHostProcess& host, const std::string& id, const std::string& answer,
+                  const std::string& status)
+{
+    CameraTest::VWireDevice device;
+    // The device before this one has not beaten for as long as it takes to let another one in.
+    EXPECT_EQ(host.Command("clock +4000"), "ok");
+    EXPECT_THAT(Authorize(device, id), HasSubstr("<Value>Pending</Value>"));
+    EXPECT_TRUE(TestSupport::ComesTrue(
+        [&] { return host.Command("state").find("\"dialog\":null") == std::string::npos; }));
+    EXPECT_EQ(host.Command(answer), "ok");
+    EXPECT_THAT(device.NextEvent(), HasSubstr("<Value>" + status + "</Value>"));
 }
 
 std::string UserPreferences(const std::string& items)
@@ -220,4 +241,27 @@ TEST(HostPreferences, AHostWithoutAHomeRunsWithoutThem)
 
     EXPECT_EQ(host.WaitExit().value_or(-1), 0);
     EXPECT_THAT(host.Errors(), HasSubstr("There is no home folder: preferences are not kept"));
+}
+
+TEST(HostPreferences, AnOperatorsChoicesSurviveARestart)
+{
+    const VTemporaryFolder temporary;
+    const std::vector<std::string> options{"--console", "--data", temporary.Path()};
+    {
+        TestSupport::VRunningHost host(options, {"env", "QT_QPA_PLATFORM=offscreen"});
+        AskAndAnswer(host, "tablet", "answer allow remember", "Authorized");
+        AskAndAnswer(host, "stranger", "answer deny remember", "Failed");
+        TestSupport::ExpectOrderlyEnd(host);
+    }
+    const std::string user = ContentOf(temporary.Path("User/User.Prefs"));
+
+    TestSupport::VRunningHost host({"--headless", "--console", "--data", temporary.Path()});
+    CameraTest::VWireDevice device;
+
+    EXPECT_THAT(Authorize(device, "stranger"), HasSubstr("<Value>Failed</Value>"));
+    EXPECT_THAT(Authorize(device, "tablet"), HasSubstr("<Value>Authorized</Value>"));
+    TestSupport::ExpectOrderlyEnd(host);
+    EXPECT_EQ(ContentOf(temporary.Path("User/User.Prefs")), user);
+    EXPECT_THAT(user, HasSubstr("<Item name=\"AllowedControls\" "));
+    EXPECT_THAT(user, HasSubstr("<Item name=\"BannedControls\" "));
 }
