@@ -390,6 +390,9 @@ public:
         }
         if (errors.empty()) {
             reader = BuildEvolvingReader(NativeSchema<T>(), NativeReaderNode<T>(), stored);
+            if (reader == nullptr) {
+                errors.emplace_back("The stored schema has no layout");
+            }
         }
     }
 

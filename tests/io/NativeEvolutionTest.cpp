@@ -372,6 +372,17 @@ TEST(NativeEvolution, TellsWhyAValueCannotBeRead)
     EXPECT_EQ(-1, four.a);
 }
 
+TEST(NativeEvolution, TellsOfAStoredSchemaWithoutALayout)
+{
+    const VNativeReader<std::vector<std::int32_t>> list(Plain(EType::List));
+    const VNativeReader<VFour> four(NamedTupleOf({{"Gone", Plain(EType::Array)}}));
+
+    EXPECT_FALSE(list.IsReadable());
+    EXPECT_EQ((std::vector<std::string>{"The stored schema has no layout"}), list.GetErrors());
+    EXPECT_FALSE(four.IsReadable());
+    EXPECT_EQ((std::vector<std::string>{"The stored schema has no layout"}), four.GetErrors());
+}
+
 TEST(NativeEvolution, ReadsManyValuesWithOneReader)
 {
     VNativeReader<VFour> reader(NamedTupleOf({{"D", int32Schema}}));
