@@ -132,7 +132,7 @@ QVariant VCameraModel::headerData(int section, Qt::Orientation orientation, int 
 
 QVariant VCameraModel::data(const QModelIndex& index, int role) const
 {
-    if (!checkIndex(index, CheckIndexOption::IndexIsValid)) {
+    if (!HasRow(index)) {
         return QVariant();
     }
     const VRow& row = rows[static_cast<std::size_t>(index.row())];
@@ -161,6 +161,11 @@ QVariant VCameraModel::data(const QModelIndex& index, int role) const
     }
 }
 
+bool VCameraModel::HasRow(const QModelIndex& index) const
+{
+    return index.isValid() && index.row() < rowCount();
+}
+
 QVariant VCameraModel::TextOf(const VRow& row, int column) const
 {
     if (column == ColumnId) {
@@ -182,7 +187,7 @@ QString VCameraModel::TipOf(const VCell& cell) const
 Qt::ItemFlags VCameraModel::flags(const QModelIndex& index) const
 {
     Qt::ItemFlags itemFlags = QAbstractTableModel::flags(index);
-    if (!checkIndex(index, CheckIndexOption::IndexIsValid)) {
+    if (!HasRow(index)) {
         return itemFlags;
     }
     const auto column = static_cast<std::size_t>(index.column());
@@ -197,7 +202,7 @@ Qt::ItemFlags VCameraModel::flags(const QModelIndex& index) const
 
 bool VCameraModel::setData(const QModelIndex& index, const QVariant& value, int role)
 {
-    if (!checkIndex(index, CheckIndexOption::IndexIsValid)) {
+    if (!HasRow(index)) {
         return false;
     }
     const VRow& row = rows[static_cast<std::size_t>(index.row())];

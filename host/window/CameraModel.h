@@ -85,6 +85,7 @@ private:
         bool IsSelected = false;
     };
 
+    bool HasRow(const QModelIndex& index) const;
     VRow MakeRow(std::uint32_t number) const;
     static bool ReadRow(const IDataVerifyReader& reader, VRow& row);
     void MatchRows(const std::vector<std::uint32_t>& numbers);

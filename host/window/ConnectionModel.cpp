@@ -70,7 +70,7 @@ QVariant VConnectionModel::headerData(int section, Qt::Orientation orientation, 
 
 QVariant VConnectionModel::data(const QModelIndex& index, int role) const
 {
-    if (!checkIndex(index, CheckIndexOption::IndexIsValid)) {
+    if (!index.isValid() || index.row() >= rowCount()) {
         return QVariant();
     }
     const VDevice& device = devices[static_cast<std::size_t>(index.row())];

@@ -94,7 +94,7 @@ QVariant VLogModel::headerData(int section, Qt::Orientation orientation, int rol
 
 QVariant VLogModel::data(const QModelIndex& index, int role) const
 {
-    if (!checkIndex(index, CheckIndexOption::IndexIsValid)) {
+    if (!index.isValid() || index.row() >= rowCount()) {
         return QVariant();
     }
     const VLogLine& line = lines[static_cast<std::size_t>(index.row())];
@@ -145,7 +145,7 @@ QVariant VLogLevelModel::headerData(int section, Qt::Orientation orientation, in
 
 QVariant VLogLevelModel::data(const QModelIndex& index, int role) const
 {
-    if (!checkIndex(index, CheckIndexOption::IndexIsValid)) {
+    if (!index.isValid() || index.row() >= rowCount()) {
         return QVariant();
     }
     const std::string& category = categories[static_cast<std::size_t>(index.row())];
@@ -169,7 +169,7 @@ bool VLogLevelModel::setData(const QModelIndex& index, const QVariant& value, in
 {
     bool isNumber = false;
     const int level = value.toInt(&isNumber);
-    if (!checkIndex(index, CheckIndexOption::IndexIsValid) || role != Qt::EditRole ||
+    if (!index.isValid() || index.row() >= rowCount() || role != Qt::EditRole ||
         index.column() != ColumnLevel || !isNumber) {
         return false;
     }

@@ -34,7 +34,8 @@ namespace {
 
 constexpr int refusalShownMilliseconds = 8000;
 constexpr int tickMilliseconds = 1000;
-constexpr QSize firstSize(980, 640);
+constexpr QSize firstSize(1280, 720);
+constexpr int firstPanelWidth = 380;
 
 /// Returns a view of a table, which scrolls where it does not fit.
 QTableView* MakeTable(QAbstractItemModel* model, const char* name)
@@ -101,7 +102,7 @@ QWidget* VMainWindow::MakeCameraPage()
                                     new VChoiceDelegate(GreyscaleModes(), table));
     table->setEditTriggers(QAbstractItemView::DoubleClicked | QAbstractItemView::EditKeyPressed |
                            QAbstractItemView::AnyKeyPressed);
-    table->resizeColumnsToContents();
+    table->horizontalHeader()->setSectionResizeMode(QHeaderView::ResizeToContents);
 
     tapBox->setObjectName("tapToSelect");
     connect(tapBox, &QCheckBox::clicked, this,
@@ -124,14 +125,16 @@ void VMainWindow::AddControlPanel()
     auto* const layout = new QVBoxLayout(panel);
     layout->addWidget(badge);
     layout->addWidget(table);
-    AddDock(*this, "Control", panel, Qt::RightDockWidgetArea);
+    table->horizontalHeader()->setSectionResizeMode(QHeaderView::ResizeToContents);
+    QDockWidget* const dock = AddDock(*this, "Control", panel, Qt::RightDockWidgetArea);
+    resizeDocks({dock}, {firstPanelWidth}, Qt::Horizontal);
 }
 
 void VMainWindow::AddLogPanel()
 {
     QTableView* const lines = MakeTable(log, "log");
     connect(log, &QAbstractItemModel::rowsInserted, lines, &QTableView::scrollToBottom);
-    lines->setColumnWidth(VLogModel::ColumnText, firstSize.width());
+    lines->setWordWrap(false);
 
     QTableView* const levels = MakeTable(logLevels, "logLevels");
     levels->setItemDelegateForColumn(VLogLevelModel::ColumnLevel,

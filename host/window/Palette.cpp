@@ -16,8 +16,8 @@ QPalette DarkPalette()
     QPalette palette(QColor(0x3f, 0x44, 0x4c), QColor(0x26, 0x29, 0x2e));
     palette.setColor(QPalette::Highlight, QColor(0x2f, 0x6f, 0xb2));
     palette.setColor(QPalette::HighlightedText, Qt::white);
-    palette.setColor(QPalette::Base, QColor(0x1d, 0x20, 0x24));
-    palette.setColor(QPalette::AlternateBase, QColor(0x23, 0x26, 0x2b));
+    palette.setColor(QPalette::Base, QColor(0x3a, 0x3f, 0x47));
+    palette.setColor(QPalette::AlternateBase, QColor(0x34, 0x39, 0x40));
     return palette;
 }
 
