@@ -24,7 +24,9 @@ TEST(HostStop, ASignalStopsItInOrder)
         host.Signal(signal);
 
         EXPECT_EQ(0, host.WaitExit().value_or(-1)) << host.Errors();
-        EXPECT_EQ("", device.ReadToEnd());
+        EXPECT_EQ(TestSupport::Frame(TestSupport::declaration +
+                                     "<Event><Name>Event.Disconnect</Name><Parameters/></Event>"),
+                  device.ReadToEnd());
     }
 }
 
@@ -33,7 +35,7 @@ TEST(HostStop, ADeviceThatDoesNotReadHoldsItUpAndIsNamed)
     VRunningHost host;
     VRawClient device = Connect(4096);
     device.Request("<ServerInformation/>");
-    ASSERT_GT(TestSupport::FireUntilStalled(host), 0);
+    ASSERT_TRUE(TestSupport::StallWithEvent(host, device));
     const auto asked = std::chrono::steady_clock::now();
 
     host.Signal(SIGTERM);
@@ -56,7 +58,7 @@ TEST(HostStop, ASecondSignalEndsItAtOnceWith130)
         VRunningHost host;
         VRawClient device = Connect(4096);
         device.Request("<ServerInformation/>");
-        ASSERT_GT(TestSupport::FireUntilStalled(host), 0);
+        ASSERT_TRUE(TestSupport::StallWithEvent(host, device));
 
         host.Signal(signal);
         ASSERT_TRUE(host.WaitForError("Stopping")); // else the two might count as one

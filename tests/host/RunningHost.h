@@ -143,28 +143,45 @@ inline void RaiseDescriptorLimit()
     setrlimit(RLIMIT_NOFILE, &limit);
 }
 
-/// Publishes events of half a mebibyte until one is not answered, because a device does not read.
-///
-/// @return how many events were published, with the last; 0 when it did not come to that
-inline int FireUntilStalled(VHostProcess& host)
+/// A text of almost the longest line that the console takes. Each of its characters is five on the
+/// wire, so that an event which holds it does not fit any connection's buffers.
+inline std::string GreatText()
 {
-    constexpr std::size_t eventBytes = 512 * 1024;
-    constexpr int mostEvents = 64; // the system's buffers hold a few mebibytes
-    // Long enough for an answer that is only slow; one that comes later fails what follows.
-    constexpr std::chrono::milliseconds stalled{3000};
+    constexpr std::size_t longestLine = std::size_t{1} << 20;
+    constexpr std::size_t roomForTheCommand = 64;
+    return std::string(longestLine - roomForTheCommand, '&');
+}
 
-    const std::string line = "fire Event.Big Text=" + std::string(eventBytes, 'x');
-    for (int i = 1; i <= mostEvents; ++i) {
-        if (!host.SendLine(line)) {
-            return 0;
-        }
-        const std::optional<std::string> answer = host.ReadLine(stalled);
-        if (!answer) {
-            return i;
-        }
-        EXPECT_EQ("ok", *answer);
+/// Sees to it that an event with the great text is more than the system keeps for a device that
+/// does not read, whose own buffer must be a small one. Throws where it is not.
+inline void ExpectGreatTextToFillBuffers()
+{
+    // The system's default. The network is the test's own, so nobody else hears of it.
+    constexpr long mostBytesToSend = 4 << 20;
+    const char* const setting = "/proc/sys/net/ipv4/tcp_wmem";
+    const auto present = [setting] {
+        long least = 0, initial = 0, most = 0;
+        std::ifstream(setting) >> least >> initial >> most;
+        return most;
+    };
+    if (present() > mostBytesToSend) {
+        std::ofstream(setting) << "4096 16384 " << mostBytesToSend;
     }
-    return 0;
+    if (present() > mostBytesToSend) {
+        throw std::runtime_error(std::string(setting) + " is above " +
+                                 std::to_string(mostBytesToSend) + " and cannot be lowered");
+    }
+}
+
+/// Publishes an event that is greater than what the system's buffers hold. Once its first bytes
+/// have come, the host is sure to be stalled until the device reads, or goes.
+///
+/// @param deaf  has a small buffer and has read all that it was sent before
+/// @return false when it did not come to that
+inline bool StallWithEvent(VHostProcess& host, const VRawClient& deaf)
+{
+    ExpectGreatTextToFillBuffers();
+    return host.SendLine("fire Event.Big Text=" + GreatText()) && deaf.AwaitReadable();
 }
 
 } // namespace TestSupport

@@ -159,6 +159,14 @@ public:
         return !buffered.empty() || ::poll(&poller, 1, 0) > 0;
     }
 
+    /// Waits until bytes or the end of the stream are there to be read. @return false at the limit
+    bool AwaitReadable() const
+    {
+        pollfd poller{descriptor, POLLIN, 0};
+        const auto limit = std::chrono::duration_cast<std::chrono::milliseconds>(Limit);
+        return !buffered.empty() || ::poll(&poller, 1, static_cast<int>(limit.count())) > 0;
+    }
+
     /// Ends the sending direction; the peer reads the end of the stream.
     void ShutdownWrite() { ::shutdown(descriptor, SHUT_WR); }
 

@@ -55,7 +55,8 @@ inline std::string SettingChanged(const std::string& camera, const std::string& 
 class VWireDevice
 {
 public:
-    VWireDevice() : client(TestSupport::Connect())
+    /// @param receiveBuffer  as of VRawClient
+    explicit VWireDevice(int receiveBuffer = 0) : client(TestSupport::Connect(receiveBuffer))
     {
         client.Request("<ServerInformation/>"); // the host has it on its list
     }
