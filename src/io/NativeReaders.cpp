@@ -196,33 +196,10 @@ public:
 /// A run of bytes that is copied, or a part that has a reader of its own.
 struct TupleStep
 {
-    std::uint64_t offset = 0;
+    std::uint64_t offset = 0; // of the run, or of the object to which the part belongs
     std::uint32_t size = 0;
     ReaderPointer reader; // null for a run
 };
-
-bool Extends(const TupleStep& run, const IReaderCollapsable& part)
-{
-    return run.reader == nullptr && run.offset + run.size == part.DestinationOffset &&
-           std::uint64_t{run.size} + part.FlatSize <= mostFlatBytes;
-}
-
-std::vector<TupleStep> MakeSteps(const std::vector<ReaderPointer>& parts)
-{
-    std::vector<TupleStep> steps;
-    for (const ReaderPointer& part : parts) {
-        const bool isFlat =
-            part->FlatSize != 0 && part->DestinationOffset != IReaderCollapsable::NoOffset;
-        if (!isFlat) {
-            steps.push_back({0, 0, part});
-        } else if (!steps.empty() && Extends(steps.back(), *part)) {
-            steps.back().size += part->FlatSize;
-        } else {
-            steps.push_back({part->DestinationOffset, part->FlatSize, nullptr});
-        }
-    }
-    return steps;
-}
 
 class VReaderTuple : public IReaderCollapsable
 {
@@ -235,11 +212,12 @@ public:
 
     bool Read(IInputStream& stream, void* destination) override
     {
+        auto* const object = static_cast<unsigned char*>(destination);
         for (const TupleStep& step : steps) {
-            const bool good =
-                step.reader == nullptr
-                    ? stream.Read(static_cast<unsigned char*>(destination) + step.offset, step.size)
-                    : step.reader->Read(stream, PlaceOf(destination, *step.reader));
+            void* const place = object + step.offset;
+            const bool good = step.reader == nullptr
+                                  ? stream.Read(place, step.size)
+                                  : step.reader->Read(stream, PlaceOf(place, *step.reader));
             if (!good) {
                 return false;
             }
@@ -247,9 +225,48 @@ public:
         return true;
     }
 
+    const std::vector<TupleStep>& GetSteps() const { return steps; }
+
 private:
     const std::vector<TupleStep> steps;
 };
+
+bool IsExtendedBy(const TupleStep& run, const TupleStep& next)
+{
+    return run.reader == nullptr && next.reader == nullptr &&
+           run.offset + run.size == next.offset &&
+           std::uint64_t{run.size} + next.size <= mostFlatBytes;
+}
+
+void AddStep(std::vector<TupleStep>& steps, const TupleStep& next)
+{
+    if (!steps.empty() && IsExtendedBy(steps.back(), next)) {
+        steps.back().size += next.size;
+    } else {
+        steps.push_back(next);
+    }
+}
+
+/// Returns the steps of all parts. A tuple among them gives its own, so that runs also join across
+/// its ends.
+std::vector<TupleStep> MakeSteps(const std::vector<ReaderPointer>& parts)
+{
+    std::vector<TupleStep> steps;
+    for (const ReaderPointer& part : parts) {
+        const bool isFlat =
+            part->FlatSize != 0 && part->DestinationOffset != IReaderCollapsable::NoOffset;
+        if (isFlat) {
+            AddStep(steps, {part->DestinationOffset, part->FlatSize, nullptr});
+        } else if (const auto* tuple = dynamic_cast<const VReaderTuple*>(part.get())) {
+            for (const TupleStep& step : tuple->GetSteps()) {
+                AddStep(steps, {tuple->DestinationOffset + step.offset, step.size, step.reader});
+            }
+        } else {
+            AddStep(steps, {0, 0, part});
+        }
+    }
+    return steps;
+}
 
 class VReaderArray : public IReaderCollapsable
 {

@@ -11,9 +11,15 @@
 
 #include <boost/bind/bind.hpp>
 
+#include <algorithm>
 #include <array>
+#include <cstdint>
+#include <limits>
+#include <memory>
+#include <string>
 #include <type_traits>
 #include <utility>
+#include <vector>
 
 // Stores C++ objects as values and reads them back, also those of older releases. A struct names
 // its members once, in the order in which they are stored:

@@ -36,6 +36,21 @@ struct VGap
     double great = 0;
 };
 
+struct VInner
+{
+    double first = 0;
+    std::string text;
+    double last = 0;
+};
+
+/// Its numbers are neighbours of those within its part.
+struct VOuter
+{
+    double before = 0;
+    VInner inner;
+    double behind = 0;
+};
+
 /// The gap is behind the members, where it parts the elements of a list.
 struct VTail
 {
@@ -86,6 +101,28 @@ template <> struct KVR::IO::NativeStruct<VGap>
     }
 };
 
+template <> struct KVR::IO::NativeStruct<VInner>
+{
+    static constexpr const char* Name = "Inner";
+    template <typename Visitor> static void Visit(Visitor&& member)
+    {
+        member("First", &VInner::first);
+        member("Text", &VInner::text);
+        member("Last", &VInner::last);
+    }
+};
+
+template <> struct KVR::IO::NativeStruct<VOuter>
+{
+    static constexpr const char* Name = "Outer";
+    template <typename Visitor> static void Visit(Visitor&& member)
+    {
+        member("Before", &VOuter::before);
+        member("Inner", &VOuter::inner);
+        member("Behind", &VOuter::behind);
+    }
+};
+
 template <> struct KVR::IO::NativeStruct<VTail>
 {
     static constexpr const char* Name = "Tail";
@@ -129,6 +166,39 @@ TEST(NativeCopies, EndAtAGapInMemory)
     EXPECT_EQ((Sizes{4, 8}), CopiesOf(MakeNativeValue(VGap{1, 2}).Bytes, gap));
     EXPECT_EQ(1, gap.small);
     EXPECT_EQ(2, gap.great);
+}
+
+TEST(NativeCopies, JoinAcrossTheEndsOfANestedStruct)
+{
+    VOuter outer;
+
+    EXPECT_EQ((Sizes{16, 4, 4, 16}),
+              CopiesOf(MakeNativeValue(VOuter{1, {2, "text", 3}, 4}).Bytes, outer));
+    EXPECT_EQ(1, outer.before);
+    EXPECT_EQ(2, outer.inner.first);
+    EXPECT_EQ("text", outer.inner.text);
+    EXPECT_EQ(3, outer.inner.last);
+    EXPECT_EQ(4, outer.behind);
+}
+
+TEST(NativeCopies, DoNotJoinOverWhatIsSteppedOverInANestedStruct)
+{
+    const ISchema number = Plain(EType::Float64);
+    const ISchema stored =
+        NamedTupleOf({{"Before", number},
+                      {"Inner", NamedTupleOf({{"Gone", Plain(EType::Int16)}, {"First", number}})},
+                      {"Behind", number}});
+    VNativeReader<VOuter> reader(stored);
+    const std::vector<unsigned char> bytes(26, 0);
+    VRecordingStream stream(bytes);
+    VOuter outer{1, {2, "kept", 3}, 4};
+
+    EXPECT_TRUE(reader.Read(stream, outer));
+
+    EXPECT_EQ((Sizes{8, 2, 8, 8}), stream.sizes);
+    EXPECT_EQ("kept", outer.inner.text);
+    EXPECT_EQ(3, outer.inner.last);
+    EXPECT_EQ(0, outer.behind);
 }
 
 TEST(NativeCopies, OfElementsWithAGapBehindThemAreOneEach)
