@@ -43,3 +43,9 @@ std::string PlainMessage(std::string message)
     message.erase(std::remove(message.begin(), message.end(), Mark), message.end());
     return message;
 }
+
+std::string CheckWhole(const std::string& text)
+{
+    const bool good = !text.empty() && text.find_first_not_of("0123456789") == std::string::npos;
+    return good ? std::string() : "\"" + text + "\" is no whole number from 0 on";
+}

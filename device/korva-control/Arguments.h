@@ -16,3 +16,7 @@ std::string PlainWord(std::string word);
 
 /// Takes all marks from a message of the parser.
 std::string PlainMessage(std::string message);
+
+/// Says what is wrong with a text that should be a whole number without a sign; empty where it is
+/// one. The parser would take a negative number for a very great one.
+std::string CheckWhole(const std::string& text);

@@ -13,6 +13,7 @@ std::vector<std::unique_ptr<ICommand>> MakeCommands()
     commands.push_back(MakeCommandRun());
     commands.push_back(MakeCommandWatch());
     commands.push_back(MakeCommandRaw());
+    commands.push_back(MakeCommandServe());
     commands.push_back(MakeCommandDoctor());
     return commands;
 }

@@ -18,4 +18,5 @@ std::unique_ptr<ICommand> MakeCommandDescribeEvent();
 std::unique_ptr<ICommand> MakeCommandRun();
 std::unique_ptr<ICommand> MakeCommandWatch();
 std::unique_ptr<ICommand> MakeCommandRaw();
+std::unique_ptr<ICommand> MakeCommandServe();
 std::unique_ptr<ICommand> MakeCommandDoctor();
