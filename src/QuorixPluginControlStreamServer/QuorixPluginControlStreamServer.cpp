@@ -21,6 +21,7 @@
 #include <QCoreApplication>
 #include <QThread>
 
+#include <chrono>
 #include <cstdint>
 
 namespace {
@@ -28,11 +29,25 @@ namespace {
 // Devices know this port; there is no setting for it.
 constexpr std::uint16_t controlStreamPort = 803;
 
+// Commands end at once, but a device that does not read its reply holds up the socket's thread. The
+// server frees that when it closes the connection.
+constexpr std::chrono::milliseconds commandPatience{2000};
+
 } // namespace
 
 VQuorixPluginControlStreamServer::VQuorixPluginControlStreamServer() = default;
 
-VQuorixPluginControlStreamServer::~VQuorixPluginControlStreamServer() = default;
+VQuorixPluginControlStreamServer::~VQuorixPluginControlStreamServer()
+{
+    // A command or a check that is running holds the authorization, whose end would then come with
+    // theirs: too late to reach the devices, once the server has gone.
+    if (socket) {
+        (void)socket->AwaitThread(commandPatience);
+    }
+    if (authorization) {
+        authorization->EndHeartbeatCheck();
+    }
+}
 
 bool VQuorixPluginControlStreamServer::Start(QuorixPluginInterface::IHost& host)
 {

@@ -10,18 +10,23 @@
 #include "QuorixPluginControlStreamServer/Authorization/ServerName.h"
 #include "io/Values.h"
 #include "notification/AsioPostalService.h"
+#include "notification/AwaitTurn.h"
 #include "notification/WeakBinding.h"
 #include "utils/LogStatement.h"
 
 #include <boost/bind/bind.hpp>
 #include <boost/system/system_error.hpp>
 
+#include <chrono>
 #include <exception>
 #include <utility>
 
 namespace {
 
 constexpr std::uint32_t checkMilliseconds = 3000;
+
+// A check takes no time but that of others who write to the store.
+constexpr std::chrono::milliseconds checkPatience{2000};
 
 /// Clears a flag at the end of its scope, also where an exception leaves it.
 class VClearAtEnd
@@ -285,8 +290,22 @@ void VQuorixControlAuthorization::ConnectStep(const std::string& deviceId,
     ScheduleCheck(deviceId);
 }
 
+void VQuorixControlAuthorization::EndHeartbeatCheck()
+{
+    {
+        const Lock lock(mutex);
+        checkEnded = true;
+        ++checkNumber;
+        heartbeatTimer.reset();
+    }
+    (void)KVR::AwaitTurn(*heartbeatMonitor, checkPatience); // beyond it the end comes late
+}
+
 void VQuorixControlAuthorization::ScheduleCheck(const std::string& deviceId)
 {
+    if (checkEnded) {
+        return;
+    }
     ++checkNumber;
     heartbeatTimer = makeTimer(
         heartbeatMonitor,

@@ -33,7 +33,7 @@ class VAsioPostalService;
 ///
 /// Owns: the known devices, which are written to the store when the last reference goes and at no
 /// other time; the thread of the heartbeat check.
-/// Threads: the operations of IControlAuthorization and the three below [any]. What may take long
+/// Threads: the operations of IControlAuthorization and the four below [any]. What may take long
 /// is posted to the host's postal service, where the operator is asked, so that it must deliver on
 /// the GUI thread. Steps and checks hold this object for their length and none keeps it alive
 /// before. Failure: what the store refuses is not looked at. A listener that throws while the last
@@ -68,6 +68,10 @@ public:
 
     /// Gives the operator's side; while there is none every device is accepted.
     void SetGUI(std::weak_ptr<IQuorixControlAuthorizationGUI> gui);
+
+    /// Ends the check of the beats for good, and waits a while for one that is running: it holds
+    /// this object, and would have to be the last to let go of it. Not for the check's own thread.
+    void EndHeartbeatCheck();
 
     /// Returns a copy of the known devices.
     VControlDevices GetDevices();
@@ -110,5 +114,6 @@ private:
     const std::shared_ptr<NotificationSystem::VAsioPostalService> heartbeatMonitor;
     std::shared_ptr<void> heartbeatTimer KVR_GUARDED_BY(mutex); // what keeps the next check alive
     std::uint64_t checkNumber KVR_GUARDED_BY(mutex) = 0;        // of the check that the timer runs
+    bool checkEnded KVR_GUARDED_BY(mutex) = false;              // for good
     std::atomic<bool> requestPending{false}; // set under the mutex, cleared and read without it
 };

@@ -1,6 +1,7 @@
 #include "QuorixPluginControlStreamServer/ControlStreamServer/SocketASIO.h"
 
 #include "QuorixPluginControlStreamServer/ControlStreamServer/ClientConnectionASIO.h"
+#include "notification/AwaitTurn.h"
 #include "utils/Mutex.h"
 
 #include <boost/asio/io_service.hpp>
@@ -97,6 +98,11 @@ void VSocketASIO::VState::OnAccept(const std::shared_ptr<tcp::socket>& socket)
     }
     const std::shared_ptr<IClientConnection> connection = VClientConnectionASIO::Create(socket);
     handler(connection); // called empty, it ends the thread: nobody would hear this device
+}
+
+bool VSocketASIO::AwaitThread(std::chrono::milliseconds limit)
+{
+    return KVR::AwaitTurn(postalService, limit);
 }
 
 VSocketASIO::~VSocketASIO() noexcept(false)

@@ -3,6 +3,7 @@
 #include "QuorixPluginControlStreamServer/ControlStreamServer/ISocket.h"
 #include "notification/AsioPostalService.h"
 
+#include <chrono>
 #include <cstdint>
 #include <memory>
 
@@ -34,6 +35,10 @@ public:
 
     /// Returns the port that it listens on, or 0 where it could not take it. [any]
     std::uint16_t Port() const { return listeningPort; }
+
+    /// Waits until the thread has left what it is inside of, but no longer than the limit. Not for
+    /// that thread. @return false at the limit
+    bool AwaitThread(std::chrono::milliseconds limit);
 
     /// Ends accepting and waits for the thread.
     ///

@@ -20,6 +20,13 @@ using testing::IsEmpty;
 
 namespace {
 
+/// A timer that does not wait.
+std::shared_ptr<void> SoonTimer(const std::shared_ptr<KVR::IAsioPostalService>& service,
+                                boost::function<void()> function, std::uint32_t /*milliseconds*/)
+{
+    return NotificationSystem::MakeDeadlineTimer(service, std::move(function), 0);
+}
+
 class AuthorizationEnd : public AuthorizationBench::VAuthorizationBench
 {
 };
@@ -164,16 +171,9 @@ TEST_F(AuthorizationEnd, AStepThatRunsIsFinishedFirst)
 
 TEST_F(AuthorizationEnd, ACheckThatHoldsTheLastReferenceEndsItOnItsOwnThread)
 {
-    using NotificationSystem::VAsioPostalService;
     NotificationTest::VLatch waits, released, ended;
-    // Real timers, which fire at once.
-    manager = KVR::MakeShared<VQuorixControlAuthorization>(
-        postal, store,
-        [](const std::shared_ptr<KVR::IAsioPostalService>& service,
-           boost::function<void()> function, std::uint32_t) -> std::shared_ptr<void> {
-            return NotificationSystem::MakeDeadlineTimer(service, std::move(function), 0);
-        },
-        clock.Function());
+    manager =
+        KVR::MakeShared<VQuorixControlAuthorization>(postal, store, &SoonTimer, clock.Function());
     manager->GetDisconnectedCallback().Add([&] { ended.CountDown(); });
     bool once = false;
     clock.Advance(4000);
@@ -192,6 +192,34 @@ TEST_F(AuthorizationEnd, ACheckThatHoldsTheLastReferenceEndsItOnItsOwnThread)
     released.CountDown();
 
     EXPECT_TRUE(ended.Wait());
+}
+
+TEST_F(AuthorizationEnd, OnceTheCheckHasEndedTheLastReferenceIsItsOwners)
+{
+    for (int round = 0; round < 100; ++round) {
+        manager = KVR::MakeShared<VQuorixControlAuthorization>(postal, store, &SoonTimer);
+        Ask("id");
+        bool told = false;
+        manager->GetDisconnectedCallback().Add([&told] { told = true; });
+
+        manager->EndHeartbeatCheck();
+        manager.reset();
+
+        ASSERT_TRUE(told) << round;
+    }
+}
+
+TEST_F(AuthorizationEnd, ACheckThatHasEndedIsNotScheduledAgain)
+{
+    Make();
+    Ask("id");
+    manager->EndHeartbeatCheck();
+
+    EXPECT_EQ(0U, timers.CountHeld());
+    Ask("other");
+
+    EXPECT_TRUE(view.IsConnected("other"));
+    EXPECT_EQ(1U, timers.CountMade());
 }
 
 namespace {
@@ -220,13 +248,6 @@ public:
         std::make_shared<VCommandProviderAuthorization>(manager);
     std::shared_ptr<ControlSystem::IEventProvider> events =
         std::make_shared<VEventProviderAuthorized>(controlSystem, manager);
-
-private:
-    static std::shared_ptr<void> SoonTimer(const std::shared_ptr<KVR::IAsioPostalService>& service,
-                                           boost::function<void()> function, std::uint32_t)
-    {
-        return NotificationSystem::MakeDeadlineTimer(service, std::move(function), 0);
-    }
 };
 
 using Release = void (*)(VReleaseBench&);
