@@ -70,8 +70,8 @@ class TableOfFacts(unittest.TestCase):
 
     @classmethod
     def setUpClass(cls) -> None:
-        with QuorixHost() as host:
-            cls.session = scenario.play(host.command, host.quit)
+        with QuorixHost(window=True) as host:
+            cls.session = scenario.play(host)
 
     def tearDown(self) -> None:
         scenario.check_facts(self.session)  # what a test changed is back
@@ -109,10 +109,17 @@ class Oddities(unittest.TestCase):
         other = facts.Oddity("Other", "", "", [(facts.execute("Host.Echo"), "<Reply/>")])
         for oddity in (silent, other):
             oddities.ODDITIES.insert(0, oddity)
-            with self.subTest(title=oddity.title), QuorixHost() as host:
+            with self.subTest(title=oddity.title), QuorixHost(window=True) as host:
                 with self.assertRaises(Surprise):
-                    scenario.play(host.command, host.quit)
+                    scenario.play(host)
             oddities.ODDITIES.remove(oddity)
+
+    def test_so_is_each_failure(self) -> None:
+        wrong = facts.Failure("wrong", facts.execute("Host.Echo"), "Error: System Error")
+        facts.FAILURES.append(wrong)
+        with QuorixHost(window=True) as host, self.assertRaisesRegex(Surprise, "^wrong: got"):
+            scenario.play(host)
+        facts.FAILURES.remove(wrong)
 
 
 class Results(unittest.TestCase):

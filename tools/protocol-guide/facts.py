@@ -44,7 +44,11 @@ AUTHORIZATION_COMMANDS = [
         "System.Authorize",
         "Asks to be let in.",
         [
-            ("DeviceId", "what the operator's answer is remembered by; the same at each start"),
+            (
+                "DeviceId",
+                "what the operator's answer is remembered by: the same at each start, of letters, "
+                "digits and hyphens",
+            ),
             ("DeviceName", "what the operator reads; markup is taken out of it"),
             ("ServerName", "may be left out; where given, the reply echoes it"),
         ],
@@ -72,7 +76,8 @@ CAMERA = ("CameraId", "the camera's number in decimal")
 
 EVENTS: Dict[str, EventFacts] = {
     "Event.Authorize": EventFacts(
-        "The operator has answered, or a device was let in without asking him.",
+        "The operator has answered, or a host without a window has let a device in. A device that is "
+        "known hears the answer in the reply only.",
         [
             ("ServerName", "the application and the computer"),
             ("Status", '"Authorized" or "Failed"'),
@@ -179,6 +184,52 @@ def reply(
         f"<CommandReply><Name>{name}</Name><Correlation>{correlation}</Correlation>"
         f"<Result>{result}</Result>{content}</CommandReply>"
     )
+
+
+CAMERA_1 = ("Param_CameraDeviceId", "1")
+
+
+@dataclass(frozen=True)
+class Failure:
+    text: str
+    request: str
+    result: str
+    cause: str = ""  # a line for the host's console before it
+
+
+FAILURES = [
+    Failure(
+        "there is no such camera",
+        execute("CameraSettings_GetStrobeIntensity", ("Param_CameraDeviceId", "99")),
+        "Error: Unable to access requested data.",
+    ),
+    Failure(
+        "the camera's number is none",
+        execute("CameraSettings_GetStrobeIntensity", ("Param_CameraDeviceId", "qx:1")),
+        "Error: Unable to access requested data.",
+    ),
+    Failure(
+        "the camera has no such setting: a video camera has no threshold",
+        execute("CameraSettings_GetCentroidThreshold", ("Param_CameraDeviceId", "3")),
+        "Error: Invalid Parameter Name",
+    ),
+    Failure(
+        "the camera refuses the value: a calibration holds it",
+        execute(
+            "CameraSettings_SetCentroidThreshold",
+            ("Param_CameraDeviceId", "4"),
+            ("Param_CentroidThreshold", "0.5"),
+        ),
+        "Error: Unable to modify read only data.",
+    ),
+    Failure(
+        "the camera's greyscale mode is one that has no text",
+        execute("CameraSettings_GetGreyscaleMode", ("Param_CameraDeviceId", "2")),
+        "Error: An unknown error occurred.",
+        "mode 2 6",
+    ),
+    Failure("the host has no such command", execute("Host.Bogus"), UNKNOWN_COMMAND),
+]
 
 
 def read_results(source: Path) -> List[Tuple[int, str]]:

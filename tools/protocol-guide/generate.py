@@ -48,8 +48,9 @@ def main() -> int:
     parser.add_argument("--docs", type=Path, default=ROOT / "docs", help="the folder of the guide")
     arguments = parser.parse_args()
     try:
-        with QuorixHost(launcher=IN_ITS_OWN_NAME, program=arguments.host_program) as host:
-            session = scenario.play(host.command, host.quit)
+        program = arguments.host_program
+        with QuorixHost(launcher=IN_ITS_OWN_NAME, program=program, window=True) as host:
+            session = scenario.play(host)
         results = facts.read_results(RESULTS)
     except (Surprise, ValueError) as error:
         print(f"protocol-guide: {error}", file=sys.stderr)

@@ -4,9 +4,8 @@ from __future__ import annotations
 
 from typing import List
 
-from facts import SILENCE, UNKNOWN_COMMAND, Oddity, execute, reply
+from facts import CAMERA_1, SILENCE, UNKNOWN_COMMAND, Oddity, execute, reply
 
-CAMERA_1 = ("Param_CameraDeviceId", "1")
 NOTHING_FOUND = (
     "<Description>Command not found.</Description><InputParameters/><ReplyParameters/>"
     "</CommandInformation>"
@@ -102,7 +101,7 @@ ODDITIES: List[Oddity] = [
         "The reply to `EventInformation` is empty for every event, known or not. Its request has "
         "the name as its own text: a `Name` inside gets silence. Neither it nor `Events` carries a "
         "correlation; the host answers in the order in which it was asked.",
-        "The names and parameters of events are part of this protocol and stand below.",
+        "The names and parameters of events are part of this protocol and stand above.",
         [
             (
                 "<EventInformation>Event.Disconnect</EventInformation>",
@@ -127,7 +126,8 @@ ODDITIES: List[Oddity] = [
     Oddity(
         "A cancellation is answered by a failure",
         "`System.Authorize.Cancel` closes the operator's dialog and then answers as an unknown "
-        "command does. It looks at no device: a device can cancel another's request.",
+        "command does. It looks at no device: a device can cancel another's request. One that "
+        "comes before the dialog is on the screen closes nothing.",
         "Devices take that answer for granted.",
         [
             (
@@ -196,6 +196,26 @@ ODDITIES: List[Oddity] = [
                     "CameraSettings_SetStrobeIntensity", CAMERA_1, ("Param_StrobeIntensity", "5.0")
                 ),
                 reply("CameraSettings_SetStrobeIntensity"),
+            ),
+        ],
+    ),
+    Oddity(
+        "Small and great numbers have an exponent",
+        'A number comes back in the host\'s own writing: "0.5", "1.0", and below 0.001 or from '
+        '100000 on "1.0e-04". The last digits may differ from what was sent.',
+        "It is how the host writes numbers everywhere.",
+        [
+            (
+                execute(
+                    "CameraSettings_SetStrobeIntensity",
+                    CAMERA_1,
+                    ("Param_StrobeIntensity", "0.0001"),
+                ),
+                reply("CameraSettings_SetStrobeIntensity"),
+            ),
+            (
+                execute("CameraSettings_GetStrobeIntensity", CAMERA_1),
+                reply("CameraSettings_GetStrobeIntensity", ("Param_StrobeIntensity", "1.0e-04")),
             ),
         ],
     ),

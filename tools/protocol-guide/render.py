@@ -79,6 +79,13 @@ def show_events(session: Session) -> str:
     return "\n\n".join(parts)
 
 
+def show_failures(_session: Session) -> str:
+    return table(
+        ("Text of `Result`", "Where"),
+        [(f'"{failure.result}"', failure.text) for failure in facts.FAILURES],
+    )
+
+
 def show_probe(exchange: Exchange) -> List[str]:
     reply = exchange.reply.text.split("?>", 1)[1] if exchange.reply is not None else "(silence)"
     return [f"→ {exchange.request.text}", f"← {reply}"]
@@ -102,6 +109,7 @@ def write_guide(template: str, session: Session, results: Results) -> str:
         "authorization-commands": show_authorization_commands,
         "events": show_events,
         "oddities": show_oddities,
+        "failures": show_failures,
         "results": lambda _: table(
             ("Code", "Text of `Result`"), [(str(code), f'"{text}"') for code, text in results]
         ),
@@ -114,6 +122,8 @@ def write_guide(template: str, session: Session, results: Results) -> str:
             return show_exchange(session.exchanges[name])
         if sort == "event":
             return show_event(session.events[name])
+        if sort == "denial" and session.denial is not None:
+            return show_event(session.denial)
         return makers[sort](session)
 
     return re.sub(r"\{\{(.*?)\}\}", fill, template)
@@ -175,6 +185,13 @@ def write_data(session: Session, results: Results) -> str:
                 "capture": frame_data(session.events[name]),
             }
             for name, event in facts.EVENTS.items()
+        ],
+        "failures": [
+            {"when": failure.text, "result": failure.result, "exchange": exchange_data(exchange)}
+            for failure, exchange in zip(facts.FAILURES, session.failures)
+        ],
+        "times": [
+            {"time": time, "bounds": what, "remark": remark} for time, what, remark in facts.TIMES
         ],
         "results": [{"code": code, "text": text} for code, text in results],
         "exchanges": {name: exchange_data(said) for name, said in session.exchanges.items()},

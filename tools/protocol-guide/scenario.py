@@ -2,17 +2,18 @@
 
 from __future__ import annotations
 
-from typing import Callable, Dict, List, Optional, Tuple
+import time
+from typing import Dict, List, Optional, Tuple
 
 import facts
 from facts import execute
 from oddities import ODDITIES
-from stage import DECLARATION, Device, Exchange, Frame, Surprise
+from stage import DECLARATION, LIMIT, Device, Exchange, Frame, Surprise
+
+from quorix_host import QuorixHost
 
 from korva_control.messages import parse_message
 from korva_control.records import CommandInformation, Event
-
-Console = Callable[[str], str]
 
 
 class Session:
@@ -21,6 +22,8 @@ class Session:
     def __init__(self) -> None:
         self.exchanges: Dict[str, Exchange] = {}
         self.events: Dict[str, Frame] = {}
+        self.denial: Optional[Frame] = None
+        self.failures: List[Exchange] = []
         self.probes: List[List[Exchange]] = []
         self.commands: List[CommandInformation] = []
         self.undescribed: List[str] = []
@@ -61,26 +64,59 @@ def discover(device: Device, session: Session) -> None:
             said["command-information"] = exchange
 
 
-def be_let_in(device: Device, session: Session) -> None:
-    said = session.exchanges
-    said["authorize"] = device.exchange(
-        execute("System.Authorize", ("DeviceId", "desk-7"), ("DeviceName", "Light desk"))
-    )
-    session.events["Event.Authorize"] = device.event("Event.Authorize")
-    said["heartbeat"] = device.exchange(execute("System.Heartbeat", ("BeatId", "1")))
+def tell(host: QuorixHost, line: str) -> None:
+    answer = host.command(line)
+    if answer != "ok":
+        raise Surprise(f"the host's console answers {answer} to: {line}")
+
+
+def authorize(device_id: str, name: str) -> str:
+    return execute("System.Authorize", ("DeviceId", device_id), ("DeviceName", name))
+
+
+def ask(device: Device, device_id: str, name: str, status: str) -> Exchange:
+    """Asks until the answer has the status. An outcome is told a moment before the request that it
+    ends is over, and until then a host says "Connected"."""
+    end = time.monotonic() + LIMIT
+    while True:
+        exchange = device.exchange(authorize(device_id, name))
+        assert exchange.reply is not None
+        if f"<Value>{status}</Value>" in exchange.reply.text:
+            return exchange
+        if "<Value>Connected</Value>" not in exchange.reply.text or time.monotonic() > end:
+            raise Surprise(f"asked for {status}, got {exchange.reply.text}")
+
+
+def be_let_in(device: Device, session: Session, host: QuorixHost) -> None:
+    said, events = session.exchanges, session.events
     other = Device()
-    # Behind a beat in the same breath, so that no pause can let the second device in.
-    other.send(execute("System.Heartbeat"))
-    request = other.send(
-        execute("System.Authorize", ("DeviceId", "desk-8"), ("DeviceName", "Other desk"))
-    )
-    other.reply()  # to the beat
-    said["authorize-taken"] = Exchange(request, other.reply())
-    said["cancel"] = other.exchange(execute("System.Authorize.Cancel", ("DeviceId", "desk-8")))
+    said["authorize-taken"] = ask_twice_and_cancel(device, other, host, said)
+    said["authorize-pending"] = ask(device, "desk-7", "Light desk", "Pending")
+    host.wait_for_dialog()
+    tell(host, "answer deny forget")
+    session.denial = device.event("Event.Authorize")
+    ask(device, "desk-7", "Light desk", "Pending")
+    host.wait_for_dialog()
+    tell(host, "answer allow remember")
+    events["Event.Authorize"] = device.event("Event.Authorize")
+    said["authorize-known"] = ask(device, "desk-7", "Light desk", "Authorized")
+    said["heartbeat"] = device.exchange(execute("System.Heartbeat", ("BeatId", "1")))
     other.close()
 
 
-def drive_cameras(device: Device, session: Session, console: Console) -> None:
+def ask_twice_and_cancel(
+    device: Device, other: Device, host: QuorixHost, said: Dict[str, Exchange]
+) -> Exchange:
+    """One device waits for the operator, another asks meanwhile, the first gives up."""
+    ask(device, "desk-7", "Light desk", "Pending")
+    host.wait_for_dialog()
+    taken = ask(other, "desk-8", "Other desk", "Connected")
+    said["cancel"] = device.exchange(execute("System.Authorize.Cancel", ("DeviceId", "desk-7")))
+    host.wait_for_dialog(False)
+    return taken
+
+
+def drive_cameras(device: Device, session: Session, host: QuorixHost) -> None:
     said, events = session.exchanges, session.events
     camera = ("Param_CameraDeviceId", "1")
     said["execute"] = device.exchange(
@@ -88,9 +124,6 @@ def drive_cameras(device: Device, session: Session, console: Console) -> None:
     )
     events["Event.Cameras.SettingChanged"] = device.event("Event.Cameras.SettingChanged")
     said["execute-reply"] = device.exchange(execute("CameraSettings_GetStrobeIntensity", camera))
-    said["execute-failure"] = device.exchange(
-        execute("CameraSettings_GetStrobeIntensity", ("Param_CameraDeviceId", "99"))
-    )
     causes: List[Tuple[str, Optional[str], Optional[str]]] = [
         (
             "Event.Cameras.GreyscaleModeChanged",
@@ -113,9 +146,21 @@ def drive_cameras(device: Device, session: Session, console: Console) -> None:
     for name, request, line in causes:
         if request is not None:
             device.exchange(request)
-        elif line is not None and console(line) != "ok":
-            raise Surprise(f"the host's console does not take: {line}")
+        elif line is not None:
+            tell(host, line)
         events[name] = device.event(name)
+
+
+def fail(device: Device, session: Session, host: QuorixHost) -> None:
+    for failure in facts.FAILURES:
+        if failure.cause:
+            tell(host, failure.cause)
+        exchange = device.exchange(failure.request)
+        assert exchange.reply is not None
+        if f"<Result>{failure.result}</Result><Parameters/>" not in exchange.reply.text:
+            raise Surprise(f"{failure.text}: got {exchange.reply.text}")
+        session.failures.append(exchange)
+    session.exchanges["execute-failure"] = session.failures[0]
 
 
 def probe(device: Device, session: Session) -> None:
@@ -149,7 +194,7 @@ def check_facts(session: Session) -> None:
         compare(f"the parameters of {name}", told, list(event.parameters))
     told_commands = [command.name for command in facts.AUTHORIZATION_COMMANDS]
     compare("commands without a description", told_commands, session.undescribed)
-    replies = dict(zip(told_commands, ("authorize", "cancel", "heartbeat")))
+    replies = dict(zip(told_commands, ("authorize-known", "cancel", "heartbeat")))
     for command in facts.AUTHORIZATION_COMMANDS:
         reply = session.exchanges[replies[command.name]].reply
         assert reply is not None
@@ -157,14 +202,15 @@ def check_facts(session: Session) -> None:
         compare(f"the reply of {command.name}", [name for name, _ in command.replies], list(shown))
 
 
-def play(console: Console, quit_host: Callable[[], int]) -> Session:
+def play(host: QuorixHost) -> Session:
     session = Session()
     device = Device()
     discover(device, session)
-    be_let_in(device, session)
-    drive_cameras(device, session, console)
+    be_let_in(device, session, host)
+    drive_cameras(device, session, host)
+    fail(device, session, host)
     probe(device, session)
-    quit_host()
+    host.quit()
     session.events["Event.Disconnect"] = device.event("Event.Disconnect")
     device.close()
     check_facts(session)

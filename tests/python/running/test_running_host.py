@@ -5,6 +5,7 @@ from typing import List
 
 from korva_control import (
     AsyncClient,
+    Authorization,
     BackOff,
     Client,
     ClientOptions,
@@ -145,6 +146,62 @@ class RunningHost(unittest.TestCase):
                 goodbye.next(LIMIT)
         with self.assertRaises(ClosedError):
             self.client.commands()
+
+
+class AskedOperator(unittest.IsolatedAsyncioTestCase):
+    """A host with a window, whose operator answers by its console."""
+
+    async def asyncSetUp(self) -> None:
+        self.host = await asyncio.get_running_loop().run_in_executor(None, self.start)
+        self.addCleanup(self.host.__exit__)
+        self.client = AsyncClient(OPTIONS)
+        await self.client.connect("127.0.0.1")
+        self.addAsyncCleanup(self.client.close)
+
+    @staticmethod
+    def start() -> QuorixHost:
+        return QuorixHost(window=True)
+
+    async def ask_and(self, answer: str) -> Authorization:
+        asking = asyncio.ensure_future(
+            self.client.authorize("desk-7", "Light desk", operator_time_limit=LIMIT)
+        )
+        loop = asyncio.get_running_loop()
+        await loop.run_in_executor(None, self.host.wait_for_dialog)
+        self.assertEqual("Light desk", self.host.state()["dialog"]["clientName"])
+        self.assertEqual("ok", await loop.run_in_executor(None, self.host.command, answer))
+        return await asyncio.wait_for(asking, LIMIT)
+
+    async def test_who_denies(self) -> None:
+        outcome = await self.ask_and("answer deny forget")
+        self.assertEqual("Failed", outcome.status)
+        self.assertEqual({}, self.host.state()["control"])
+
+    async def test_who_allows_and_remembers(self) -> None:
+        self.assertTrue((await self.ask_and("answer allow remember")).granted)
+        again = await self.client.authorize("desk-7", "Another name")
+        self.assertEqual("Authorized", again.status)
+        self.assertIsNone(self.host.state()["dialog"])
+
+    async def test_who_bans(self) -> None:
+        self.assertEqual("Failed", (await self.ask_and("answer deny remember")).status)
+        with self.client.listen("Event.Authorize") as events:
+            again = await self.client.authorize("desk-7", "Light desk")
+            self.assertEqual("Failed", again.status)
+            await self.client.commands()
+            with self.assertRaises(TimedOutError):
+                await events.next(0.01)
+
+    async def test_whose_dialog_is_taken_away(self) -> None:
+        loop = asyncio.get_running_loop()
+        asking = asyncio.ensure_future(self.client.authorize("desk-7", "Light desk"))
+        await loop.run_in_executor(None, self.host.wait_for_dialog)
+        async with AsyncClient(OPTIONS) as other:
+            await other.connect("127.0.0.1")
+            self.assertEqual("Connected", (await other.authorize("desk-8", "Other")).status)
+        await self.client.cancel_authorization("desk-7")
+        await loop.run_in_executor(None, self.host.wait_for_dialog, False)
+        asking.cancel()
 
 
 class RestartedHost(unittest.IsolatedAsyncioTestCase):

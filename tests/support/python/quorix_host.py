@@ -8,6 +8,7 @@ import queue
 import subprocess
 import tempfile
 import threading
+import time
 from typing import Any, Dict, List, Optional, Sequence
 
 LIMIT = 60.0
@@ -26,15 +27,26 @@ class QuorixHost:
         arguments: Sequence[str] = (),
         launcher: Sequence[str] = (),
         program: Optional[str] = None,
+        window: bool = False,
     ) -> None:
+        """@param window: whether the host has one, on no screen, and so asks its operator"""
         self._folder = tempfile.TemporaryDirectory()
+        environment = {
+            **os.environ,
+            "XDG_RUNTIME_DIR": self._folder.name,
+            "QT_QPA_PLATFORM": "offscreen",
+            "QT_QUICK_BACKEND": "software",
+        }
         program = program or os.environ["QUORIX_HOST_PROGRAM"]
-        options = ["--headless", "--console", "--data", self._folder.name, *arguments]
+        options = ["--console", "--data", self._folder.name, *arguments]
+        if not window:
+            options.append("--headless")
         self._process = subprocess.Popen(
             [*launcher, program, *options],
             stdin=subprocess.PIPE,
             stdout=subprocess.PIPE,
             stderr=subprocess.DEVNULL,
+            env=environment,
             text=True,
         )
         self._lines: "queue.Queue[str]" = queue.Queue()
@@ -64,6 +76,13 @@ class QuorixHost:
         assert answer.startswith("ok "), answer
         state: Dict[str, Any] = json.loads(answer[3:])
         return state
+
+    def wait_for_dialog(self, is_open: bool = True) -> None:
+        """Waits until the operator's dialog is open, or closed."""
+        end = time.monotonic() + LIMIT
+        while (self.state()["dialog"] is not None) is not is_open:
+            if time.monotonic() > end:
+                raise RuntimeError(f"the dialog did not {'open' if is_open else 'close'}")
 
     def kill(self) -> None:
         self._process.kill()
