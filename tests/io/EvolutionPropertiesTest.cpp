@@ -183,3 +183,34 @@ TEST(EvolutionProperties, WhatTheComparisonCallsReadableReadsAndTheRestDoesNoHar
     EXPECT_GT(unreadable, seeds / 4);
     EXPECT_LT(unreadable, seeds);
 }
+
+TEST(EvolutionProperties, WayBackReadsWhereTheComparisonSaysSo)
+{
+    std::size_t readable = 0;
+    for (std::uint32_t seed = 0; seed < seeds; ++seed) {
+        const VPair forth = MakePair(seed, true);
+        VPair back{forth.current, forth.stored, {}, forth.text};
+        VRandomSchema::Limits limits;
+        limits.withoutText = false;
+        VRandomSchema(seed + 2).AppendValue(back.bytes, back.stored, limits);
+        const VSchemaLayout layout(back.current);
+        const auto reader = BuildEvolvingReader(back.current, layout.MakeNode(0), back.stored);
+        if (!ErrorsOf(back).empty()) {
+            if (reader != nullptr) {
+                Read(*reader, layout, back.bytes);
+            }
+            continue;
+        }
+        ++readable;
+        ASSERT_NE(nullptr, reader) << back.text;
+        ByteVector expected;
+        ASSERT_TRUE(ConvertThroughText(back.stored, back.bytes, back.current, expected))
+            << back.text;
+        const VOutcome outcome = Read(*reader, layout, back.bytes);
+        ASSERT_TRUE(outcome.good) << back.text;
+        ASSERT_EQ(back.bytes.size(), outcome.position) << back.text;
+        ASSERT_EQ(expected, outcome.bytes) << back.text;
+    }
+    EXPECT_GT(readable, seeds / 10);
+    EXPECT_LT(readable, seeds);
+}
