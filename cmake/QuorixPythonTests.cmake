@@ -6,6 +6,7 @@ set(QUORIX_PYTHON_TEST_ENVIRONMENT
     "PYTHONPATH=${PROJECT_SOURCE_DIR}/device/python:${PROJECT_SOURCE_DIR}/tests/support/python"
     "PYTHONDONTWRITEBYTECODE=1"
     "QUORIX_HOST_PROGRAM=$<TARGET_FILE:quorix-host>"
+    "KORVA_CONTROL_PROGRAM=$<TARGET_FILE:korva-control>"
 )
 
 # quorix_add_python_test(NAME COMMAND WORD... [FOLDER ..] [TIMEOUT s] [NAMESPACE])

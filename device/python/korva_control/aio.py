@@ -181,7 +181,7 @@ class AsyncClient:
             return
         self._ready.clear()
         self._tell(State.LOST, str(link.error))
-        if self._options.reconnect is None or isinstance(link.error, ProtocolError):
+        if self._options.reconnect is None:
             self._closed = link.error
             self._ready = None
             self._end_streams(link.error)
