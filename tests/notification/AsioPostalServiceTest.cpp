@@ -1,14 +1,10 @@
 #include "notification/AsioPostalService.h"
 
 #include "DebugServices/ThreadName.h"
-#include "notification/DeregisterWeakCallbackException.h"
 #include "notification/Support.h"
-#include "support/LogCapture.h"
 
-#include <boost/asio/deadline_timer.hpp>
 #include <boost/asio/io_service.hpp>
 #include <boost/asio/ip/tcp.hpp>
-#include <boost/thread/thread.hpp>
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
@@ -17,11 +13,9 @@
 
 #include <algorithm>
 #include <atomic>
-#include <cstdlib>
 #include <memory>
 #include <mutex>
 #include <set>
-#include <stdexcept>
 #include <string>
 #include <thread>
 #include <type_traits>
@@ -29,25 +23,12 @@
 #include <vector>
 
 using NotificationSystem::VAsioPostalService;
-using NotificationTest::AtEndOfThisThread;
+using NotificationTest::PostAndWait;
 using NotificationTest::SlotOf;
-using NotificationTest::VLastWord;
 using NotificationTest::VLatch;
-using testing::AllOf;
 using testing::ElementsAre;
-using testing::HasSubstr;
-using testing::IsEmpty;
 
 namespace {
-
-/// Waits until a service has done everything that was posted to it before. With several threads the
-/// other ones may still be busy.
-void PostAndWait(KVR::IPostalService& service)
-{
-    VLatch reached;
-    service.Post([&reached] { reached.CountDown(); }, 0);
-    ASSERT_TRUE(reached.Wait());
-}
 
 TEST(AsioPostalService, SlotsAreInOrder)
 {
@@ -175,96 +156,6 @@ TEST(AsioPostalService, RunsItsThreadsAboveNormalWhereItMay)
 
     ASSERT_TRUE(called.Wait());
     EXPECT_EQ(permitted == 0 ? above : present, priority);
-}
-
-TEST(AsioPostalService, StartOnAStartedServiceReturnsFalseAndAddsNoThread)
-{
-    VAsioPostalService service("X", 1, 0);
-    EXPECT_FALSE(service.Start(1));
-    EXPECT_FALSE(service.Start(0));
-
-    // With a second thread the second function would run while the first waits.
-    std::atomic<int> running{0};
-    std::atomic<int> most{0};
-    VLatch release;
-    for (int i = 0; i < 2; ++i) {
-        service.Post(
-            [&] {
-                most = std::max(most.load(), ++running);
-                release.Wait();
-                --running;
-            },
-            0);
-    }
-    release.CountDown();
-    service.Stop();
-    EXPECT_EQ(1, most);
-}
-
-TEST(AsioPostalService, StopOnAStoppedServiceReturnsFalse)
-{
-    VAsioPostalService service("X", 1, 0);
-
-    EXPECT_TRUE(service.Stop());
-    EXPECT_FALSE(service.Stop());
-    EXPECT_FALSE(VAsioPostalService("Y", 0, 0).Stop());
-}
-
-TEST(AsioPostalService, WithoutThreadsStaysStoppedAndKeepsWhatIsPosted)
-{
-    VAsioPostalService service("X", 0, 0);
-    std::atomic<int> calls{0};
-    service.Post([&calls] { ++calls; }, 0);
-
-    EXPECT_FALSE(service.Start(0));
-    EXPECT_EQ(0, calls);
-    EXPECT_TRUE(service.Start(1));
-    PostAndWait(service);
-    EXPECT_EQ(1, calls);
-}
-
-TEST(AsioPostalService, StopLetsTheQueueRunEmpty)
-{
-    VAsioPostalService service("X", 1, 0);
-    VLatch release;
-    int calls = 0;
-    service.Post([&release] { release.Wait(); }, 0);
-    for (int i = 0; i < 100; ++i) {
-        service.Post([&calls] { ++calls; }, 0);
-    }
-
-    release.CountDown();
-    EXPECT_TRUE(service.Stop());
-
-    EXPECT_EQ(100, calls);
-}
-
-TEST(AsioPostalService, StopWaitsForPendingOperations)
-{
-    VAsioPostalService service("X", 1, 0);
-    bool expired = false;
-    boost::asio::deadline_timer timer(service.GetIOService());
-    timer.expires_from_now(boost::posix_time::milliseconds(20));
-    timer.async_wait([&expired](const boost::system::error_code&) { expired = true; });
-
-    EXPECT_TRUE(service.Stop());
-
-    EXPECT_TRUE(expired);
-}
-
-TEST(AsioPostalService, DeliversAfterARestartWhatWasPostedWhileItWasStopped)
-{
-    VAsioPostalService service("X", 1, 0);
-    EXPECT_TRUE(service.Stop());
-    std::string called;
-    service.Post([&called] { called += 'a'; }, 0);
-    service.Post([&called] { called += 'b'; }, 0);
-    EXPECT_EQ("", called);
-
-    EXPECT_TRUE(service.Start(1));
-    PostAndWait(service);
-
-    EXPECT_EQ("ab", called);
 }
 
 TEST(AsioPostalService, StartsAndStopsAnyNumberOfTimesWithAnyNumberOfThreads)
@@ -407,126 +298,6 @@ TEST(AsioPostalService, QueuedFunctionsLiveAsLongAsTheIOService)
     EXPECT_EQ(1, held.use_count());
 }
 
-TEST(AsioPostalService, DropsAFunctionWhoseTargetIsGoneAndGoesOn)
-{
-    const TestSupport::VLogCapture log;
-    VAsioPostalService service("X", 1, 0);
-
-    service.Post([] { throw KVR::VDeregisterWeakCallbackException(); }, 0);
-    PostAndWait(service);
-
-    EXPECT_THAT(log.Messages(), IsEmpty());
-}
-
-/// Posts a function that throws, and waits until its thread has ended.
-template <typename Exception>
-void PostExceptionAndWait(KVR::IPostalService& service, const Exception& exception)
-{
-    VLatch ended;
-    service.Post(
-        [&ended, exception] {
-            AtEndOfThisThread([&ended] { ended.CountDown(); });
-            throw exception;
-        },
-        0);
-    ASSERT_TRUE(ended.Wait());
-}
-
-TEST(AsioPostalService, AnExceptionIsReportedWithTheThreadsName)
-{
-    const TestSupport::VLogCapture log;
-    VAsioPostalService service("Control Heartbeat Monitor", 1, 0);
-
-    PostExceptionAndWait(service, std::runtime_error("not today"));
-
-    const std::vector<TestSupport::VLoggedMessage> messages = log.Messages();
-    ASSERT_EQ(1u, messages.size());
-    EXPECT_EQ("Notification", messages[0].Category);
-    EXPECT_EQ(2, messages[0].Level);
-    EXPECT_THAT(messages[0].Text,
-                AllOf(HasSubstr("Control Heartbeat Monitor0"), HasSubstr("not today")));
-}
-
-TEST(AsioPostalService, AnExceptionEndsNothingButItsThread)
-{
-    const TestSupport::VLogCapture log;
-    VAsioPostalService otherService("Y", 1, 0);
-    VAsioPostalService service("X", 2, 0);
-
-    PostExceptionAndWait(service, 7); // no std::exception
-
-    PostAndWait(otherService);
-    PostAndWait(service); // its other thread
-    EXPECT_EQ(1u, log.Messages().size());
-    EXPECT_TRUE(service.Stop());
-}
-
-TEST(AsioPostalService, AnEmptyFunctionEndsItsThread)
-{
-    const TestSupport::VLogCapture log;
-    VAsioPostalService service("X", 1, 0);
-    VLatch ended;
-    service.Post([&ended] { AtEndOfThisThread([&ended] { ended.CountDown(); }); }, 0);
-
-    service.Post(boost::function<void()>(), 0);
-
-    ASSERT_TRUE(ended.Wait());
-    EXPECT_THAT(log.Texts("Notification"), ElementsAre(HasSubstr("call to empty boost::function")));
-}
-
-TEST(AsioPostalService, ARestartGoesOnWithTheQueueThatAnExceptionLeft)
-{
-    const TestSupport::VLogCapture log;
-    VAsioPostalService service("X", 1, 0);
-    PostExceptionAndWait(service, std::runtime_error("out"));
-    std::string called;
-    service.Post([&called] { called += 'a'; }, 0);
-
-    EXPECT_FALSE(service.Start(1)); // it still counts as started
-    EXPECT_TRUE(service.Stop());    // and does not wait for a queue that nobody empties
-    EXPECT_EQ("", called);
-    EXPECT_TRUE(service.Start(1));
-    PostAndWait(service);
-
-    EXPECT_EQ("a", called);
-}
-
-TEST(AsioPostalService, QueuedFunctionsAreFreedUncalledAfterAnExceptionEndedTheOnlyThread)
-{
-    const TestSupport::VLogCapture log;
-    const auto held = std::make_shared<int>(1);
-    {
-        VAsioPostalService service("X", 1, 0);
-        PostExceptionAndWait(service, std::runtime_error("out"));
-        service.Post([held] { FAIL() << "called"; }, 0);
-    }
-    EXPECT_EQ(1, held.use_count());
-}
-
-TEST(AsioPostalService, GoesOnAlthoughItsIOServiceWasMarkedAsStopped)
-{
-    VAsioPostalService service("X", 1, 0);
-    PostAndWait(service);
-
-    service.GetIOService().stop(); // as it does by itself when it runs out of work
-
-    PostAndWait(service);
-    EXPECT_TRUE(service.Stop());
-}
-
-TEST(AsioPostalServiceDeathTest, ACrashOfAThreadIsReportedWithItsName)
-{
-    GTEST_FLAG_SET(death_test_style, "threadsafe");
-
-    EXPECT_DEATH(
-        {
-            VAsioPostalService service("Crashing", 1, 0);
-            service.Post([] { std::abort(); }, 0);
-            service.Stop();
-        },
-        "Crashing0");
-}
-
 TEST(AsioPostalService, CompletesSocketOperationsOnItsThreads)
 {
     VAsioPostalService service("X", 1, 0);
@@ -547,110 +318,6 @@ TEST(AsioPostalService, CompletesSocketOperationsOnItsThreads)
 
     ASSERT_TRUE(completed.Wait());
     EXPECT_EQ("X0", thread);
-}
-
-/// While it lives, no further thread can be started: its stack would not fit any address space.
-class VNoFurtherThreads
-{
-public:
-    VNoFurtherThreads()
-    {
-        pthread_getattr_default_np(&usual);
-        pthread_attr_t huge;
-        pthread_attr_init(&huge);
-        pthread_attr_setstacksize(&huge, std::size_t{1} << 47);
-        pthread_setattr_default_np(&huge);
-        pthread_attr_destroy(&huge);
-    }
-    ~VNoFurtherThreads()
-    {
-        pthread_setattr_default_np(&usual);
-        pthread_attr_destroy(&usual);
-    }
-
-    VNoFurtherThreads(const VNoFurtherThreads&) = delete;
-    VNoFurtherThreads& operator=(const VNoFurtherThreads&) = delete;
-
-private:
-    pthread_attr_t usual;
-};
-
-TEST(AsioPostalService, ThrowsFromItsConstructorWhereNoThreadCanBeMade)
-{
-    const VNoFurtherThreads limit;
-
-    EXPECT_THROW(VAsioPostalService("X", 1, 0), boost::thread_resource_error);
-}
-
-TEST(AsioPostalService, IsStoppedAfterAStartThatThrew)
-{
-    VAsioPostalService service("X", 0, 0);
-    {
-        const VNoFurtherThreads limit;
-        EXPECT_THROW(service.Start(1), boost::thread_resource_error);
-    }
-
-    EXPECT_FALSE(service.Stop());
-    EXPECT_TRUE(service.Start(1));
-    PostAndWait(service);
-}
-
-TEST(AsioPostalService, MayBeStartedAndStoppedByManyThreads)
-{
-    VAsioPostalService service("X", 0, 0);
-    std::atomic<int> changes{0};
-    std::atomic<int> calls{0};
-    std::vector<std::thread> threads;
-    threads.reserve(4);
-    for (int i = 0; i < 3; ++i) {
-        threads.emplace_back([&] {
-            for (int round = 0; round < 50; ++round) {
-                changes += service.Start(1) ? 1 : 0;
-                service.Post([&calls] { ++calls; }, 0);
-                changes -= service.Stop() ? 1 : 0;
-            }
-        });
-    }
-    for (std::thread& thread : threads) {
-        thread.join();
-    }
-    EXPECT_EQ(0, changes); // every start had its stop
-
-    service.Start(1);
-    service.Stop();
-    EXPECT_EQ(150, calls);
-}
-
-TEST(AsioPostalService, StopWaitsAlsoOnAThreadThatIsInterrupted)
-{
-    VAsioPostalService service("X", 1, 0);
-    VLatch running;
-    VLatch release;
-    std::atomic<bool> functionEnded{false};
-    service.Post(
-        [&] {
-            running.CountDown();
-            release.Wait();
-            functionEnded = true;
-        },
-        0);
-    ASSERT_TRUE(running.Wait());
-
-    VLatch interrupted;
-    bool stopped = false;
-    bool endedBefore = false;
-    boost::thread stopping([&] {
-        interrupted.Wait();
-        release.CountDown();
-        stopped = service.Stop();
-        endedBefore = functionEnded;
-    });
-    stopping.interrupt();
-    interrupted.CountDown();
-    stopping.join();
-
-    EXPECT_TRUE(stopped);
-    EXPECT_TRUE(endedBefore);
 }
 
 } // namespace

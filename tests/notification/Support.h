@@ -4,6 +4,7 @@
 #include "notification/IPostalService.h"
 
 #include <boost/function.hpp>
+#include <gtest/gtest.h>
 
 #include <chrono>
 #include <condition_variable>
@@ -108,6 +109,15 @@ public:
         KVR::GuardedCall(function);
     }
 };
+
+/// Waits until a service has done everything that was posted to it before. With several threads the
+/// other ones may still be busy.
+inline void PostAndWait(KVR::IPostalService& service)
+{
+    VLatch reached;
+    service.Post([&reached] { reached.CountDown(); }, 0);
+    ASSERT_TRUE(reached.Wait());
+}
 
 /// Returns the place of a virtual operation in its table. A pointer to such an operation holds one
 /// more than the operation's offset there.
