@@ -18,6 +18,7 @@
 #include "io/SchemaText.h"
 #include "io/SkipReaders.h"
 #include "io/TextModel.h"
+#include "io/ValueConversion.h"
 #include "io/VectorReader.h"
 
 #include <algorithm>
@@ -139,6 +140,18 @@ bool HasUnstoredElements(const ISchema& schema)
     });
 }
 
+/// True if an entry of an enum has a number that its width cannot keep.
+bool HasGreatEntries(const ISchema& schema)
+{
+    const std::int32_t most = schema.Type == EType::Enum8    ? 0x7F
+                              : schema.Type == EType::Enum16 ? 0x7FFF
+                                                             : 0x7FFFFFFF;
+    return std::any_of(schema.EnumValues.begin(), schema.EnumValues.end(),
+                       [most](const ISchema::EnumValue& entry) {
+                           return entry.second > most || entry.second < -most - 1;
+                       });
+}
+
 /// True if the text of a value does not bring back the same bytes, or may be megabytes long.
 bool IsLossyAsText(const ISchema& schema)
 {
@@ -149,7 +162,7 @@ bool IsLossyAsText(const ISchema& schema)
                }
                return part.Type == EType::Float32 || part.Type == EType::Float64 ||
                       part.Count > 100 || names.size() != part.EnumValues.size() ||
-                      (IsEnumType(part.Type) && part.EnumValues.empty());
+                      HasGreatEntries(part) || (IsEnumType(part.Type) && part.EnumValues.empty());
            });
 }
 
@@ -172,15 +185,42 @@ VResult Read(IReaderCollapsable& reader, const VSchemaLayout& layout, const VInp
     return result;
 }
 
-bool IsReadable(const VInput& input)
+bool IsConvertible(const VInput& input)
 {
     std::vector<std::string> warnings;
     std::vector<std::string> errors;
     CompareSchemas(input.stored, input.current, warnings, errors, "path");
-    if (errors.empty()) {
-        Detail::FindUnmappableEnums(input.stored, input.current, errors, "path");
-    }
+    return errors.empty() && IsTidy(input.stored) && IsTidy(input.current);
+}
+
+/// True if readers of objects can do what conversions can: they cannot map narrow enums.
+bool IsReadable(const VInput& input)
+{
+    std::vector<std::string> errors;
+    Detail::FindUnmappableEnums(input.stored, input.current, errors, "path");
     return errors.empty();
+}
+
+/// Converts the value, without the bytes behind it, and holds the result against its text.
+void TryConversion(const VInput& input)
+{
+    Detail::VVectorReader cursor(input.bytes);
+    IInputStreamAdapter<Detail::VVectorReader> stream(&cursor);
+    const std::shared_ptr<IReaderCollapsable> skip = BuildSkipReader(input.stored);
+    std::vector<unsigned char> bytes = input.bytes;
+    const bool isWhole = skip != nullptr && skip->Read(stream, nullptr);
+    if (isWhole) {
+        bytes.resize(cursor.GetPosition());
+    }
+    std::vector<unsigned char> result;
+    const bool converted = ConvertValue(input.stored, bytes, input.current, result);
+    Require(isWhole || !converted, "what is cut off cannot be converted");
+    std::vector<unsigned char> expected;
+    if (isWhole && !IsLossyAsText(input.stored) && !IsLossyAsText(input.current) &&
+        ConvertThroughText(input.stored, bytes, input.current, expected)) {
+        Require(converted, "what has a text can be converted");
+        Require(expected == result, "the text gives what the conversion gives");
+    }
 }
 
 void CompareWithText(const VInput& input, const VResult& result)
@@ -217,11 +257,15 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
         return 0;
     }
     TryNamedTypes(input.stored);
-    const bool isReadable = IsReadable(input) && IsTidy(input.stored) && IsTidy(input.current);
     const VSchemaLayout layout(input.current);
     if (layout.isTooLarge) {
         return 0;
     }
+    const bool isConvertible = IsConvertible(input);
+    if (isConvertible) {
+        TryConversion(input);
+    }
+    const bool isReadable = isConvertible && IsReadable(input);
     const std::shared_ptr<IReaderCollapsable> reader =
         BuildEvolvingReader(input.current, layout.MakeNode(0), input.stored);
     if (reader == nullptr) {
