@@ -118,6 +118,34 @@ class CommandLine(unittest.TestCase):
         self.assertEqual(4, code)
         self.assertIn("timed out after 0.1 s, waiting for the server information", errors)
 
+    def test_output_that_nobody_reads_is_no_traceback(self) -> None:
+        def script(peer: Peer) -> None:
+            peer.greet()
+            peer.read()
+            peer.send(LIST)
+            peer.wait_for_end()
+
+        reading, writing = os.pipe()
+        os.close(reading)
+        with ScriptedHost(script) as host:
+            words = [sys.executable, "-m", "korva_control", "--port", str(host.port), "commands"]
+            done = subprocess.run(words, stdout=writing, stderr=subprocess.PIPE, timeout=LIMIT)
+        os.close(writing)
+        self.assertEqual((1, b""), (done.returncode, done.stderr))
+
+    def test_a_terminal_without_utf_8_gets_what_it_can_show(self) -> None:
+        def script(peer: Peer) -> None:
+            peer.greet()
+            peer.reply(peer.read(), parameters=parameter("p", "é😀"))
+
+        with ScriptedHost(script) as host:
+            words = [sys.executable, "-m", "korva_control", "--port", str(host.port), "run", "A"]
+            environment = {**os.environ, "PYTHONIOENCODING": "ascii"}
+            output = subprocess.run(
+                words, capture_output=True, timeout=LIMIT, env=environment, check=True
+            ).stdout
+        self.assertEqual(b"OK\np=\\xe9\\U0001f600\n", output)
+
     def test_help_tells_the_exit_codes(self) -> None:
         code, output, _ = run("--help")
         self.assertEqual(0, code)

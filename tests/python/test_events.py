@@ -3,7 +3,7 @@ import threading
 from typing import List
 
 from client_case import SHORT, ClientCase
-from korva_control import ClientOptions, Event, TimedOutError
+from korva_control import ClientOptions, ClosedError, Event, TimedOutError, UsageError
 from scripted_host import LIMIT, Peer, parameter
 
 
@@ -82,6 +82,17 @@ class Events(ClientCase):
         first = await events.next()
         self.assertGreater(events.dropped, 90)
         self.assertEqual(f"Event.{events.dropped}", first.name)
+
+    async def test_only_one_waits_for_the_next_event_of_a_stream(self) -> None:
+        await self.start(Peer.wait_for_end)
+        events = self.client.listen()
+        first = asyncio.ensure_future(events.next())
+        await asyncio.sleep(0)
+        with self.assertRaisesRegex(UsageError, "somebody waits"):
+            await events.next()
+        await self.client.close()
+        with self.assertRaises(ClosedError):
+            await first
 
     async def test_waiting_for_an_event_tells_which(self) -> None:
         await self.start(Peer.wait_for_end)

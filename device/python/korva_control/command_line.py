@@ -3,7 +3,9 @@
 from __future__ import annotations
 
 import argparse
+import io
 import json
+import os
 import sys
 import time
 from typing import Dict, List, Optional, Sequence, Tuple
@@ -226,6 +228,9 @@ def _exit_code(error: ControlError) -> int:
 
 def main(words: Optional[Sequence[str]] = None) -> int:
     arguments = make_parser().parse_args(words)
+    for stream in (sys.stdout, sys.stderr):
+        if isinstance(stream, io.TextIOWrapper):
+            stream.reconfigure(errors="backslashreplace")  # for a terminal that has no UTF-8
     try:
         return _Program(arguments).run()
     except KeyboardInterrupt:
@@ -234,5 +239,6 @@ def main(words: Optional[Sequence[str]] = None) -> int:
         print(f"korva_control: {for_terminal(str(error))}", file=sys.stderr)
         return _exit_code(error)
     except BrokenPipeError:
-        sys.stderr.close()
+        # Whoever read the output has gone. What Python would still flush has nobody to go to.
+        os.dup2(os.open(os.devnull, os.O_WRONLY), sys.stdout.fileno())
         return HOST_FAILED

@@ -6,7 +6,7 @@ import asyncio
 from collections import deque
 from typing import Deque, FrozenSet, Iterable, Optional, Tuple
 
-from .errors import ClosedError, ControlError, TimedOutError
+from .errors import ClosedError, ControlError, TimedOutError, UsageError
 from .records import Event
 
 
@@ -70,6 +70,8 @@ class EventStream:
         return self._take()
 
     async def _wait(self, time_limit: Optional[float]) -> None:
+        if self._waiter is not None:
+            raise UsageError("somebody waits for the next of these events already")
         self._waiter = asyncio.get_running_loop().create_future()
         try:
             await asyncio.wait_for(self._waiter, time_limit)
