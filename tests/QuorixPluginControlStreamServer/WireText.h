@@ -1,0 +1,14 @@
+#pragma once
+
+#include "RunningServer.h"
+
+// What the tests of the wire share: how every reply begins, and how a server may be set.
+
+#define DECLARATION "<?xml version=\"1.0\" encoding=\"UTF-16\" standalone=\"no\"?>"
+
+inline const VServerMode serverModes[] = {
+    {"AsThePlugInSetsIt", false, false},
+    {"OnItsOwnPostalService", false, true},
+    {"TranslatingEntities", true, false},
+    {"TranslatingEntitiesOnItsOwnPostalService", true, true},
+};
