@@ -1,4 +1,4 @@
-"""Writes session.pcapng: a session with a running host, captured on the loopback of its own network.
+"""Writes session.pcap: a session with a running host, captured on the loopback of its own network.
 
     tests/support/in-network-namespace python3 tests/wireshark/make_capture.py HOST_PROGRAM
 
@@ -104,8 +104,8 @@ def wait_for(line: str, process: "subprocess.Popen[str]") -> None:
 
 
 def main() -> None:
-    target = HERE / "session.pcapng"
-    command = ["dumpcap", "-q", "-i", "lo", "-f", "tcp port 803", "-w", str(target)]
+    target = HERE / "session.pcap"
+    command = ["dumpcap", "-q", "-P", "-i", "lo", "-f", "tcp port 803", "-w", str(target)]
     with QuorixHost(launcher=IN_ITS_OWN_NAME, program=sys.argv[1]) as host:
         capture = subprocess.Popen(command, stderr=subprocess.PIPE, text=True)
         wait_for("File:", capture)

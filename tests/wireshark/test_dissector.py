@@ -21,7 +21,7 @@ DISSECTOR = ROOT / "device" / "wireshark" / "korva.lua"
 NOBODY = 65534
 LIMIT = 120.0
 
-# The messages of session.pcapng in their order.
+# The messages of session.pcap in their order.
 # fmt: off
 STILL_THERE = [
     ("ServerInformation", "request", "", "", ""),
@@ -123,7 +123,7 @@ class Case(unittest.TestCase):
 class Session(Case):
     def setUp(self) -> None:
         super().setUp()
-        shutil.copyfile(HERE / "session.pcapng", self.folder / "session.pcapng")
+        shutil.copyfile(HERE / "session.pcap", self.folder / "session.pcap")
 
     def test_each_message_is_told_with_its_elements(self) -> None:
         for index, field in enumerate(("message", "kind", "name", "correlation", "result")):
@@ -131,7 +131,7 @@ class Session(Case):
                 found = [
                     value
                     for (values,) in self.fields(
-                        "session.pcapng", f"korva.{field}", show=f"korva.{field}"
+                        "session.pcap", f"korva.{field}", show=f"korva.{field}"
                     )
                     for value in values.split("|")
                     if value
@@ -140,7 +140,7 @@ class Session(Case):
 
     def test_the_parameters_are_decoded(self) -> None:
         found = self.fields(
-            "session.pcapng",
+            "session.pcap",
             "korva.parameter",
             "korva.parameter.name",
             "korva.parameter.value",
@@ -157,30 +157,30 @@ class Session(Case):
             found,
         )
         echo = self.fields(
-            "session.pcapng", "korva.parameter.value", show='korva.correlation == "6"'
+            "session.pcap", "korva.parameter.value", show='korva.correlation == "6"'
         )
         self.assertEqual([["<é😀&>"]] * 2, echo)
 
     def test_lists_and_descriptions(self) -> None:
         ((commands,),) = self.fields(
-            "session.pcapng", "korva.listed", show='korva.listed && korva.message == "Commands"'
+            "session.pcap", "korva.listed", show='korva.listed && korva.message == "Commands"'
         )
         self.assertEqual(19, len(commands.split("|")))
         self.assertIn("System.Heartbeat", commands.split("|"))
         ((described, parameters),) = self.fields(
-            "session.pcapng",
+            "session.pcap",
             "korva.description",
             "korva.parameter.name",
             show="korva.description" ' && korva.message == "CommandInformation"',
         )
         self.assertEqual("Returns current strobe intensity", described)
         self.assertEqual("Param_CameraDeviceId|Param_StrobeIntensity", parameters)
-        versions = self.fields("session.pcapng", "korva.version", show="korva.version")
+        versions = self.fields("session.pcap", "korva.version", show="korva.version")
         self.assertEqual(["1.0"], versions[0])
 
     def test_a_reply_leads_to_its_request_and_back(self) -> None:
         rows = self.fields(
-            "session.pcapng",
+            "session.pcap",
             "frame.number",
             "korva.correlation",
             "korva.request_in",
@@ -190,7 +190,7 @@ class Session(Case):
         self.assertEqual(["1", "2", "3", "4", "5", "6", "7", "8", "9", "10"], [r[1] for r in rows])
         for number, correlation, request, seconds in rows:
             ((asked, replied),) = self.fields(
-                "session.pcapng",
+                "session.pcap",
                 "korva.correlation",
                 "korva.reply_in",
                 show=f"frame.number == {request}",
@@ -201,7 +201,7 @@ class Session(Case):
             self.assertLess(float(seconds), 5)
 
     def test_what_the_host_drops_is_marked_with_the_reason(self) -> None:
-        found = self.fields("session.pcapng", "_ws.expert.message", show="korva.silent")
+        found = self.fields("session.pcap", "_ws.expert.message", show="korva.silent")
         self.assertEqual(
             [
                 ["The host answers nothing: it is none of the six requests"],
@@ -212,14 +212,14 @@ class Session(Case):
             found,
         )
         self.assertEqual(
-            2, len(self.fields("session.pcapng", "korva.length", show="korva.unreadable"))
+            2, len(self.fields("session.pcap", "korva.length", show="korva.unreadable"))
         )
-        failed = self.fields("session.pcapng", "_ws.expert.message", show="korva.failure")
+        failed = self.fields("session.pcap", "_ws.expert.message", show="korva.failure")
         self.assertEqual([["The command failed: Error: Unable to access requested data."]], failed)
 
     def test_the_column_tells_the_message_in_a_line(self) -> None:
         lines = [
-            info for (info,) in self.fields("session.pcapng", "_ws.col.Info", show="korva.kind")
+            info for (info,) in self.fields("session.pcap", "_ws.col.Info", show="korva.kind")
         ]
         self.assertEqual("ServerInformation", lines[0])
         self.assertIn("Commands #1 19 listed", lines)
@@ -234,12 +234,12 @@ class Session(Case):
         )
 
     def test_another_port_may_be_chosen(self) -> None:
-        output = self.tshark("session.pcapng", "-o", "korva.port:810", "-Y", "korva")
+        output = self.tshark("session.pcap", "-o", "korva.port:810", "-Y", "korva")
         self.assertEqual("", output)
 
     def test_a_frame_in_four_packets_is_shown_whole_in_the_last(self) -> None:
         ((length, value),) = self.fields(
-            "session.pcapng",
+            "session.pcap",
             "korva.length",
             "korva.parameter.value",
             show='korva.kind == "request" && korva.length > 3000',
@@ -250,7 +250,7 @@ class Session(Case):
 
 class Guide(Case):
     def test_every_command_of_the_guide_prints_what_stands_below_it(self) -> None:
-        for part in ("device/wireshark/korva.lua", "tests/wireshark/session.pcapng"):
+        for part in ("device/wireshark/korva.lua", "tests/wireshark/session.pcap"):
             target = self.folder / part
             target.parent.mkdir(parents=True)
             shutil.copyfile(ROOT / part, target)
