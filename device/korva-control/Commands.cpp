@@ -11,6 +11,7 @@ std::vector<std::unique_ptr<ICommand>> MakeCommands()
     commands.push_back(MakeCommandEvents());
     commands.push_back(MakeCommandDescribeEvent());
     commands.push_back(MakeCommandRun());
+    commands.push_back(MakeCommandAuthorize());
     commands.push_back(MakeCommandWatch());
     commands.push_back(MakeCommandRaw());
     commands.push_back(MakeCommandServe());

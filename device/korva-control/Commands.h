@@ -16,6 +16,7 @@ std::unique_ptr<ICommand> MakeCommandDescribe();
 std::unique_ptr<ICommand> MakeCommandEvents();
 std::unique_ptr<ICommand> MakeCommandDescribeEvent();
 std::unique_ptr<ICommand> MakeCommandRun();
+std::unique_ptr<ICommand> MakeCommandAuthorize();
 std::unique_ptr<ICommand> MakeCommandWatch();
 std::unique_ptr<ICommand> MakeCommandRaw();
 std::unique_ptr<ICommand> MakeCommandServe();
