@@ -34,8 +34,8 @@ namespace {
 
 constexpr int refusalShownMilliseconds = 8000;
 constexpr int tickMilliseconds = 1000;
-constexpr QSize firstSize(1280, 720);
-constexpr int firstPanelWidth = 380;
+constexpr QSize firstSize(1360, 720);
+constexpr int firstPanelWidth = 460;
 
 /// Returns a view of a table, which scrolls where it does not fit.
 QTableView* MakeTable(QAbstractItemModel* model, const char* name)
