@@ -13,6 +13,7 @@ from .errors import (
     TimedOutError,
     UsageError,
 )
+from .lint import LintReport, lint_request
 from .listening import EventStream
 from .options import BackOff, ClientOptions, State
 from .records import (
@@ -43,6 +44,7 @@ __all__ = [
     "Event",
     "EventInformation",
     "EventStream",
+    "LintReport",
     "Listener",
     "NoConnectionError",
     "ParameterInformation",
@@ -52,4 +54,5 @@ __all__ = [
     "State",
     "TimedOutError",
     "UsageError",
+    "lint_request",
 ]
