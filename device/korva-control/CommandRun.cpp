@@ -1,5 +1,6 @@
 #include "ControlStreamClient/Requests.h"
 #include "korva-control/Arguments.h"
+#include "korva-control/Assignments.h"
 #include "korva-control/Commands.h"
 #include "korva-control/Session.h"
 #include "korva-control/TerminalText.h"
@@ -8,21 +9,8 @@
 
 namespace {
 
-using ControlStream::EErrorKind;
 using ControlStream::VCommandReply;
-using ControlStream::VError;
 using ControlStream::VParameter;
-
-/// Cuts "Name=value" at the first "="; the value may hold more of them.
-VParameter ParseAssignment(const std::string& text)
-{
-    const std::size_t equals = text.find('=');
-    if (equals == std::string::npos) {
-        throw VError(EErrorKind::Usage,
-                     "a parameter is written as NAME=VALUE, not as \"" + text + "\"");
-    }
-    return {text.substr(0, equals), text.substr(equals + 1)};
-}
 
 class VCommandRun : public ICommand
 {
@@ -39,10 +27,7 @@ public:
 
     EExitCode Run(VSession& session) override
     {
-        ControlStream::VParameters parameters;
-        for (const std::string& assignment : assignments) {
-            parameters.push_back(ParseAssignment(assignment));
-        }
+        const ControlStream::VParameters parameters = ParseAssignments(assignments);
         ControlStream::MakeExecuteCommandRequest("1", name, parameters); // refuses early
         const VCommandReply reply = session.Connect().ExecuteCommand(name, parameters);
 

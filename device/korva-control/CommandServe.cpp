@@ -1,4 +1,5 @@
 #include "korva-control/Arguments.h"
+#include "korva-control/AwaitedSignals.h"
 #include "korva-control/Commands.h"
 #include "korva-control/Session.h"
 
@@ -8,8 +9,6 @@
 #include "FakeHost/SimulatedContent.h"
 
 #include <cmath>
-#include <csignal>
-#include <ctime>
 #include <fstream>
 #include <map>
 
@@ -25,43 +24,6 @@ const std::map<std::string, EDecision> Decisions{
     {"allow", EDecision::Allow},          {"deny", EDecision::Deny},
     {"ask-allow", EDecision::AskAllow},   {"ask-deny", EDecision::AskDeny},
     {"ask-nobody", EDecision::AskNobody},
-};
-
-/// SIGINT and SIGTERM, taken one by one instead of ending the process. Made before any thread, as
-/// threads inherit what is blocked.
-class VAwaitedSignals
-{
-public:
-    VAwaitedSignals()
-    {
-        sigemptyset(&signals);
-        sigaddset(&signals, SIGINT);
-        sigaddset(&signals, SIGTERM);
-        pthread_sigmask(SIG_BLOCK, &signals, &previous);
-    }
-
-    ~VAwaitedSignals() { pthread_sigmask(SIG_SETMASK, &previous, nullptr); }
-
-    VAwaitedSignals(const VAwaitedSignals&) = delete;
-    VAwaitedSignals& operator=(const VAwaitedSignals&) = delete;
-
-    /// Waits for one, or for the time limit where there is one.
-    void Await(std::optional<std::chrono::milliseconds> limit) const
-    {
-        if (!limit) {
-            int number = 0;
-            sigwait(&signals, &number);
-            return;
-        }
-        timespec time{};
-        time.tv_sec = static_cast<std::time_t>(limit->count() / 1000);
-        time.tv_nsec = static_cast<long>(limit->count() % 1000) * 1000000;
-        sigtimedwait(&signals, nullptr, &time);
-    }
-
-private:
-    sigset_t signals{};
-    sigset_t previous{};
 };
 
 class VCommandServe : public ICommand

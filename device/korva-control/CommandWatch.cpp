@@ -1,8 +1,8 @@
 #include "korva-control/Arguments.h"
 #include "korva-control/Commands.h"
+#include "korva-control/EventLine.h"
 #include "korva-control/Session.h"
 #include "korva-control/StopSignals.h"
-#include "korva-control/TerminalText.h"
 
 #include <algorithm>
 
@@ -34,6 +34,12 @@ public:
             "A --timeout that is given bounds the whole of it; without one it goes on.");
         command->add_option("EVENT", names, "Only events of these names; all where none is given")
             ->transform(&PlainWord);
+        command
+            ->add_option("--camera", cameras, "Only events about these cameras, by their numbers")
+            ->check(&CheckWhole)
+            ->type_name("NUMBER")
+            ->allow_extra_args(false); // behind it stand the names of events
+        command->add_flag("--time", stamps, "Print the time of each event, in universal time");
         command->add_option("--count", count, "End after so many events")->check(&CheckCount);
         return command;
     }
@@ -52,7 +58,7 @@ public:
         while (seen < count && !stop.IsRequested()) {
             const std::chrono::milliseconds left = TimeLeft(session, start);
             const std::optional<VEvent> event = client.WaitForEvent(left);
-            if (event && IsWanted(event->Name)) {
+            if (event && IsWanted(*event)) {
                 Print(session.Output(), *event);
                 ++seen;
             } else if (!stop.IsRequested() && left <= std::chrono::milliseconds::zero()) {
@@ -75,25 +81,34 @@ private:
                         std::chrono::milliseconds::zero());
     }
 
-    bool IsWanted(const std::string& name) const
+    bool IsWanted(const VEvent& event) const
     {
-        return names.empty() || std::find(names.begin(), names.end(), name) != names.end();
+        const bool byName =
+            names.empty() || std::find(names.begin(), names.end(), event.Name) != names.end();
+        const auto isAbout = [&event](std::uint32_t camera) {
+            return IsAboutCamera(event, camera);
+        };
+        return byName && (cameras.empty() || std::any_of(cameras.begin(), cameras.end(), isAbout));
     }
 
-    static void Print(VOutput& output, const VEvent& event)
+    void Print(VOutput& output, const VEvent& event) const
     {
+        const std::string time =
+            stamps ? TimeStamp(std::chrono::system_clock::now()) : std::string();
         if (output.IsJson()) {
-            output.PrintJson({{"event", event.Name}, {"parameters", ToJson(event.Parameters)}});
+            VJson object = {{"event", event.Name}, {"parameters", ToJson(event.Parameters)}};
+            if (stamps) {
+                object["time"] = time;
+            }
+            output.PrintJson(object);
             return;
         }
-        std::string line = ForTerminal(event.Name);
-        for (const ControlStream::VParameter& parameter : event.Parameters) {
-            line += " " + ForTerminal(parameter.Name) + "=" + WordForTerminal(parameter.Value);
-        }
-        output.PrintLine(line);
+        output.PrintLine((stamps ? time + " " : std::string()) + EventLine(event));
     }
 
     std::vector<std::string> names;
+    std::vector<std::uint32_t> cameras;
+    bool stamps = false;
     std::uint64_t count = std::numeric_limits<std::uint64_t>::max();
 };
 

@@ -19,5 +19,8 @@ std::unique_ptr<ICommand> MakeCommandRun();
 std::unique_ptr<ICommand> MakeCommandAuthorize();
 std::unique_ptr<ICommand> MakeCommandWatch();
 std::unique_ptr<ICommand> MakeCommandRaw();
+std::unique_ptr<ICommand> MakeCommandRecord();
+std::unique_ptr<ICommand> MakeCommandReplay();
+std::unique_ptr<ICommand> MakeCommandBench();
 std::unique_ptr<ICommand> MakeCommandServe();
 std::unique_ptr<ICommand> MakeCommandDoctor();

@@ -72,6 +72,9 @@ public:
         return errors->WaitFor(text, TestSupport::hostLimit);
     }
 
+    /// Returns what came on standard error so far.
+    std::string Errors() const { return errors->Text(); }
+
     void Signal(int signal) const { kill(pid, signal); }
 
     /// Waits until an output that is not read takes no more.
