@@ -1,7 +1,6 @@
 #include "QuorixPluginControlStreamServer/ControlStreamServer/ClientConnectionASIO.h"
 
-#include "Arrivals.h"
-#include "QuorixPluginControlStreamServer/ControlStreamServer/SocketASIO.h"
+#include "ConnectionFixture.h"
 #include "SegmentCount.h"
 #include "support/RawClient.h"
 
@@ -25,51 +24,7 @@ using TestSupport::VRawClient;
 static_assert(!std::is_nothrow_destructible_v<IClientConnection>);
 static_assert(!std::is_nothrow_destructible_v<VClientConnectionASIO>);
 
-/// Accepts connections and collects their messages; nobody answers.
-class ClientConnection : public testing::Test
-{
-protected:
-    ClientConnection()
-    {
-        socket->SetConnectionHandler([this](const std::shared_ptr<IClientConnection>& connection) {
-            if (listening) {
-                connection->GetMessageCallback().SetDirect(
-                    [this](const std::shared_ptr<IClientConnection>& sender,
-                           const std::wstring& message) {
-                        if (onMessage) {
-                            onMessage(sender);
-                        }
-                        messages.Add(message);
-                    });
-            }
-            connections.Add(connection);
-        });
-    }
-
-    ~ClientConnection() override { Stop(); }
-
-    void Stop()
-    {
-        for (const auto& connection : connections.All()) {
-            if (const auto open = connection.lock()) {
-                open->Close();
-            }
-        }
-        socket.reset();
-    }
-
-    /// Returns the server's end of the connection that was made last, alone held by its reading.
-    std::weak_ptr<IClientConnection> ConnectionOf(std::size_t index)
-    {
-        return connections.Wait(index + 1)[index];
-    }
-
-    std::shared_ptr<VSocketASIO> socket = std::make_shared<VSocketASIO>(0);
-    bool listening = true;
-    boost::function<void(const std::shared_ptr<IClientConnection>&)> onMessage;
-    VArrivals<std::weak_ptr<IClientConnection>> connections;
-    VArrivals<std::wstring> messages;
-};
+using ClientConnection = VConnectionFixture;
 
 struct VFrameCase
 {
@@ -395,82 +350,6 @@ TEST_F(ClientConnection, OutlivesItsSocketOnceClosed)
     connection.reset();
 
     EXPECT_EQ("", client.ReadToEnd());
-}
-
-/// More than the buffers of both ends can hold.
-constexpr std::size_t TooMuch = 12 * 1024 * 1024;
-constexpr int SmallBuffer = 4096;
-
-class BlockedSend : public ClientConnection
-{
-protected:
-    BlockedSend() : client(socket->Port(), SmallBuffer), connection(ConnectionOf(0).lock())
-    {
-        sender = std::thread([this] {
-            connection->Send(std::wstring(TooMuch, L'x'));
-            returned = true;
-        });
-        // The first bytes are there, and the last cannot be.
-        blocked = BecomesTrue([this] { return client.IsReadable(); }) && !returned;
-    }
-
-    ~BlockedSend() override
-    {
-        client.Close(); // so that a test that has failed ends too
-        sender.join();
-    }
-
-    VRawClient client;
-    std::shared_ptr<IClientConnection> connection;
-    std::atomic<bool> returned{false};
-    bool blocked = false;
-    std::thread sender;
-};
-
-TEST_F(BlockedSend, GoesOnWhenThePeerReads)
-{
-    ASSERT_TRUE(blocked);
-
-    EXPECT_EQ(std::string(TooMuch, 'x'), client.ReadFrame());
-
-    EXPECT_TRUE(BecomesTrue([this] { return returned.load(); }));
-}
-
-TEST_F(BlockedSend, ReturnsWhenThePeerCloses)
-{
-    ASSERT_TRUE(blocked);
-
-    client.Close();
-
-    EXPECT_TRUE(BecomesTrue([this] { return returned.load(); }));
-}
-
-TEST_F(BlockedSend, ReturnsWhenThePeerIsKilled)
-{
-    ASSERT_TRUE(blocked);
-
-    client.Reset();
-
-    EXPECT_TRUE(BecomesTrue([this] { return returned.load(); }));
-}
-
-TEST_F(BlockedSend, ReturnsWhenTheConnectionIsClosedHere)
-{
-    ASSERT_TRUE(blocked);
-
-    connection->Close();
-
-    EXPECT_TRUE(BecomesTrue([this] { return returned.load(); }));
-}
-
-TEST_F(BlockedSend, DoesNotKeepTheConnectionFromReading)
-{
-    ASSERT_TRUE(blocked);
-
-    client.SendFrame("request");
-
-    EXPECT_EQ(std::vector<std::wstring>{L"request"}, messages.Wait(1));
-    connection->Close();
 }
 
 /// Returns the descriptor of this process's other end of a connection.
