@@ -24,6 +24,10 @@ namespace {
 
 constexpr const char* ServiceType = "_korva._tcp";
 
+// Most hosts have no IPv6 address, of which the service is sure only after five seconds. One that
+// is there comes with the other.
+constexpr std::chrono::milliseconds restLimit{300};
+
 /// Makes the C library's way of destroying its objects a deleter.
 template <auto Free>
 struct VFree
@@ -79,8 +83,14 @@ public:
     std::vector<VDiscoveredHost> Browse(const VDeadline& deadline, const IsEnough& isEnough)
     {
         Start();
-        while (!IsComplete() && !deadline.IsOver()) {
-            if (avahi_simple_poll_iterate(poll.get(), deadline.PollMilliseconds()) != 0) {
+        VDeadline end = deadline;
+        bool isWaitingForRest = false;
+        while (!IsComplete() && !end.IsOver()) {
+            if (!isWaitingForRest && IsUsable()) {
+                isWaitingForRest = true;
+                end = deadline.Sooner(restLimit);
+            }
+            if (avahi_simple_poll_iterate(poll.get(), end.PollMilliseconds()) != 0) {
                 failure = failure != 0 ? failure : AVAHI_ERR_DISCONNECTED;
             }
             if (failure != 0) {
@@ -124,6 +134,14 @@ private:
     }
 
     bool IsComplete() const { return isAllForNow && pending.empty(); }
+
+    /// Whether nothing is missing but further addresses of hosts that have one.
+    bool IsUsable() const
+    {
+        return isAllForNow && std::all_of(seen.begin(), seen.end(), [](const auto& one) {
+                   return !one.second.IPv4.empty() || !one.second.IPv6.empty();
+               });
+    }
 
     std::vector<VDiscoveredHost> Hosts() const
     {
