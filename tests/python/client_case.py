@@ -3,11 +3,12 @@
 from __future__ import annotations
 
 import asyncio
+import dataclasses
 import unittest
 from typing import Callable
 
 from korva_control import AsyncClient, ClientOptions
-from scripted_host import Peer, ScriptedHost
+from scripted_host import LIMIT, Peer, ScriptedHost
 
 SHORT = 0.05
 """A time limit that is meant to run out."""
@@ -33,7 +34,7 @@ class ClientCase(unittest.IsolatedAsyncioTestCase):
             return whole
 
         self.host = ScriptedHost(*map(greeting, scripts))
-        self.client = AsyncClient(options)
+        self.client = AsyncClient(dataclasses.replace(options, time_limit=LIMIT))
         await self.client.connect("127.0.0.1", self.host.port)
 
     async def asyncTearDown(self) -> None:

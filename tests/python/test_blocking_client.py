@@ -1,3 +1,4 @@
+import dataclasses
 import threading
 import unittest
 from typing import Callable, List
@@ -29,7 +30,7 @@ class BlockingClient(unittest.TestCase):
             return whole
 
         self.host = ScriptedHost(*map(greeting, scripts))
-        self.client = Client(options)
+        self.client = Client(dataclasses.replace(options, time_limit=LIMIT))
         self.all_events = self.client.listen()
         self.client.connect("127.0.0.1", self.host.port)
 

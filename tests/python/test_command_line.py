@@ -84,7 +84,7 @@ class CommandLine(unittest.TestCase):
         self.assertEqual({"event": "Event.Other", "parameters": {}}, json.loads(output))
 
     def test_watch_ends_with_4_at_its_time_limit_and_with_3_where_the_host_goes(self) -> None:
-        code, _, errors = run_on(Peer.wait_for_end, "watch", "--timeout", "0.5")
+        code, _, errors = run_on(Peer.wait_for_end, "watch", "--timeout", "2")
         self.assertEqual(4, code)
         self.assertIn("timed out, waiting for an event; 0 came in time", errors)
         code, _, errors = run_on(lambda peer: None, "watch")

@@ -51,16 +51,15 @@ class Sources(unittest.TestCase):
 
     @unittest.skipUnless(shutil.which("mypy"), "mypy is not installed")
     def test_the_types_hold(self) -> None:
-        for version in ("3.9", "3.11"):
-            done = subprocess.run(
-                ["mypy", "--strict", "--python-version", version, "--cache-dir", "/dev/null"]
-                + [str(PYTHON / "korva_control"), *map(str, PYTHON.glob("examples/*.py"))],
-                capture_output=True,
-                text=True,
-                cwd=PYTHON,
-                check=False,
-            )
-            self.assertEqual(0, done.returncode, done.stdout)
+        done = subprocess.run(
+            ["mypy", "--strict", "--python-version", "3.9", "--cache-dir", "/dev/null"]
+            + [str(PYTHON / "korva_control"), *map(str, PYTHON.glob("examples/*.py"))],
+            capture_output=True,
+            text=True,
+            cwd=PYTHON,
+            check=False,
+        )
+        self.assertEqual(0, done.returncode, done.stdout)
 
     def test_are_of_a_readable_size(self) -> None:
         for source in SOURCES:
