@@ -1,19 +1,10 @@
-#include "QuorixDataStore/DataStorePersistence.h"
-
-#include "StoreFixture.h"
-#include "io/Values.h"
-#include "support/LogCapture.h"
+#include "PersistenceFixture.h"
 
 #include <gmock/gmock.h>
-
-#include <set>
 
 using namespace StoreTest;
 using testing::ElementsAre;
 using testing::IsEmpty;
-using TestSupport::VLogCapture;
-using TestSupport::VLoggedMessage;
-using TestSupport::VLogLevel;
 
 namespace {
 
@@ -22,121 +13,7 @@ using EDataValueFlags::NotSerialized;
 using EDataValueFlags::ReadOnly;
 using EDataValueFlags::VerifyRequired;
 
-/// A target that refuses what it is told to refuse.
-class VRefusingWriter : public VDataVerifyWriter
-{
-public:
-    VRefusingWriter(IDataStore& store, std::set<std::string> refused)
-        : VDataVerifyWriter(store), refused(std::move(refused))
-    {
-    }
-
-    bool SetFlags(const VDataToken& token, std::uint32_t flags) override
-    {
-        return refused.count("flags") == 0 && VDataVerifyWriter::SetFlags(token, flags);
-    }
-    bool SetProposedValue(const VDataToken& token, const VDataValue& value) override
-    {
-        return refused.count("proposed") == 0 && VDataVerifyWriter::SetProposedValue(token, value);
-    }
-    bool SetVerifiedValue(const VDataToken& token, const VDataValue& value) override
-    {
-        return refused.count("verified") == 0 && VDataVerifyWriter::SetVerifiedValue(token, value);
-    }
-    bool Remove(const VDataToken& token) override
-    {
-        return refused.count("remove") == 0 && VDataVerifyWriter::Remove(token);
-    }
-
-private:
-    const std::set<std::string> refused;
-};
-
-/// A source that cannot tell an item's flags.
-class VFlaglessReader : public VDataVerifyReader
-{
-public:
-    using VDataVerifyReader::VDataVerifyReader;
-
-    bool GetFlags(const VDataToken&, std::uint32_t& flags) const override
-    {
-        flags = 0xFF; // left behind by a failed read
-        return false;
-    }
-};
-
-/// One item as a store holds it.
-struct VItem
-{
-    bool Exists = false;
-    std::uint32_t Flags = 0;
-    VDataValue Proposed;
-    VDataValue Verified;
-};
-
-class DataStorePersistenceTest : public testing::Test
-{
-protected:
-    static void Put(IDataStore& store, const char* path, std::uint32_t flags,
-                    const VDataValue& verified, const VDataValue& proposed = VDataValue())
-    {
-        VDataVerifyWriter writer(store);
-        if (flags != 0) {
-            EXPECT_TRUE(writer.SetFlags(Token(path), flags));
-        }
-        if (!verified.Empty()) {
-            EXPECT_TRUE(writer.SetVerifiedValue(Token(path), verified));
-        }
-        if (!proposed.Empty()) {
-            EXPECT_TRUE(writer.SetProposedValue(Token(path), proposed));
-        }
-    }
-
-    static VItem Get(const IDataStore& store, const char* path)
-    {
-        const VDataVerifyReader reader(store);
-        VItem item;
-        item.Exists = reader.GetFlags(Token(path), item.Flags);
-        reader.GetVerifiedValue(Token(path), item.Verified);
-        if ((item.Flags & VerifyRequired) != 0) {
-            reader.GetProposedValue(Token(path), item.Proposed);
-        }
-        return item;
-    }
-
-    EDataCopyResult Copy(const char* path, std::uint32_t options,
-                         const std::set<std::string>& refused = {})
-    {
-        const VDataVerifyReader reader(source);
-        VRefusingWriter writer(target, refused);
-        return DataStorePersistence::CopyValue(Token(path), reader, writer, options);
-    }
-
-    EDataCopyResult CopyAllOf(const char* path, std::uint32_t options,
-                              const std::set<std::string>& refused = {})
-    {
-        const VDataVerifyReader reader(source);
-        VRefusingWriter writer(target, refused);
-        return DataStorePersistence::CopyValues(VDataPath(path), reader, writer, options);
-    }
-
-    /// Returns what was logged to the store's category, each with its level.
-    Texts Logged() const
-    {
-        Texts lines;
-        for (const VLoggedMessage& message : log.Messages()) {
-            if (message.Category == "DataStore") {
-                lines.push_back(std::to_string(message.Level) + ": " + message.Text);
-            }
-        }
-        return lines;
-    }
-
-    const VLogLevel level{"DataStore", 6};
-    const VLogCapture log;
-    VDataStore source;
-    VDataStore target;
-};
+using DataStorePersistenceTest = PersistenceFixture;
 
 TEST_F(DataStorePersistenceTest, NumbersOfOptionsAndResultsAreFixed)
 {
@@ -421,107 +298,6 @@ TEST_F(DataStorePersistenceTest, AnItemRemovedInTheSameLockCountsAsNotExisting)
     }
 
     EXPECT_EQ(Get(target, "A").Verified, Byte(1));
-}
-
-TEST_F(DataStorePersistenceTest, CopiesAWholeStoreAsOneCommit)
-{
-    Put(source, "A", 0, Byte(1));
-    Put(source, "B.C", VerifyRequired, Byte(2), Byte(3));
-    std::uint64_t before = 0;
-    {
-        before = VDataReader(target).GetCurrentChangeId();
-    }
-
-    EXPECT_EQ(CopyAllOf("*", CopyAll), EDataCopyResult::CopyDone);
-
-    EXPECT_EQ(VDataReader(target).GetCurrentChangeId(), before + 1);
-    EXPECT_EQ(Get(target, "A").Verified, Byte(1));
-    EXPECT_EQ(Get(target, "B.C").Proposed, Byte(3));
-}
-
-TEST_F(DataStorePersistenceTest, CopiesWhatAPathFinds)
-{
-    Put(source, "A.B.C", 0, Byte(1));
-    Put(source, "A.D.C", 0, Byte(2));
-    Put(source, "A.B.E", 0, Byte(3));
-
-    EXPECT_EQ(CopyAllOf("A.*.C", 0), EDataCopyResult::CopyDone);
-
-    const VDataReader reader(target);
-    EXPECT_THAT(Find(reader, "*"), ElementsAre("A.B.C", "A.D.C"));
-}
-
-TEST_F(DataStorePersistenceTest, WithoutAnItemTheCopyIsSkipped)
-{
-    Put(source, "A", 0, Byte(1));
-
-    EXPECT_EQ(CopyAllOf("B.*", 0), EDataCopyResult::CopySkipped);
-    EXPECT_EQ(CopyAllOf("", 0), EDataCopyResult::CopySkipped);
-}
-
-TEST_F(DataStorePersistenceTest, SkippedItemsCountAsDone)
-{
-    Put(source, "A", ReadOnly, Byte(1));
-    Put(source, "B", ReadOnly, Byte(1));
-
-    EXPECT_EQ(CopyAllOf("*", SkipReadOnly), EDataCopyResult::CopyDone);
-}
-
-TEST_F(DataStorePersistenceTest, EveryItemIsTriedAndFailuresAreCounted)
-{
-    Put(source, "A", 0, Byte(1));
-    Put(source, "B", VerifyRequired, VDataValue(), Byte(2));
-
-    EXPECT_EQ(CopyAllOf("*", 0, {"verified"}), EDataCopyResult::CopyPartial);
-    EXPECT_EQ(Get(target, "B").Proposed, Byte(2));
-    EXPECT_EQ(CopyAllOf("*", 0, {"verified", "proposed"}), EDataCopyResult::CopyFailed);
-    EXPECT_EQ(CopyAllOf("A", 0, {"verified"}), EDataCopyResult::CopyFailed);
-}
-
-TEST_F(DataStorePersistenceTest, RemovesWhatTheOptionsDoNotKeep)
-{
-    Put(target, "A.A", 0, Byte(1));
-    Put(target, "A.B", ReadOnly, Byte(1));
-    Put(target, "A.C", NotSerialized, Byte(1));
-    Put(target, "B", 0, Byte(1));
-    {
-        VDataVerifyWriter writer(target);
-        DataStorePersistence::RemoveValues(VDataPath("A.*"), writer,
-                                           SkipReadOnly | SkipNotSerialized);
-    }
-    const VDataReader reader(target);
-
-    EXPECT_THAT(Find(reader, "*"), ElementsAre("A.B", "A.C", "B"));
-    EXPECT_THAT(Logged(), ElementsAre("6: skipping read only parameter 'A.B'",
-                                      "6: skipping not serialized value 'A.C'."));
-}
-
-TEST_F(DataStorePersistenceTest, RemovesEverythingWithoutOptions)
-{
-    Put(target, "A", ReadOnly, Byte(1));
-    Put(target, "B", NotSerialized, Byte(1));
-    {
-        VDataVerifyWriter writer(target);
-        DataStorePersistence::RemoveValues(VDataPath("*"), writer, CopyAll | SkipExisting);
-        DataStorePersistence::RemoveValues(VDataPath("None"), writer, 0);
-    }
-    const VDataReader reader(target);
-
-    EXPECT_THAT(Find(reader, "*"), IsEmpty());
-    EXPECT_THAT(Logged(), IsEmpty());
-}
-
-TEST_F(DataStorePersistenceTest, ARemovalThatIsRefusedIsLoggedAndTheNextOneTried)
-{
-    Put(target, "A", 0, Byte(1));
-    Put(target, "B", 0, Byte(1));
-    {
-        VRefusingWriter writer(target, {"remove"});
-        DataStorePersistence::RemoveValues(VDataPath("*"), writer, 0);
-    }
-
-    EXPECT_THAT(Logged(), ElementsAre("2: Error removing 'A' parameter value",
-                                      "2: Error removing 'B' parameter value"));
 }
 
 } // namespace

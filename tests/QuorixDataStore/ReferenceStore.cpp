@@ -1,5 +1,7 @@
 #include "ReferenceStore.h"
 
+#include "ReferencePaths.h"
+
 #include <algorithm>
 
 namespace StoreTest {
@@ -7,26 +9,6 @@ namespace StoreTest {
 namespace {
 
 constexpr std::uint32_t verifyRequired = 2;
-
-bool StartsWith(const Names& path, const Names& prefix)
-{
-    return path.size() >= prefix.size() && std::equal(prefix.begin(), prefix.end(), path.begin());
-}
-
-/// True if a pattern names a path: "*" is one component, a last one any number of further ones.
-bool NamesPath(const Names& pattern, const Names& path)
-{
-    if (pattern.empty() || pattern.size() > path.size() ||
-        (pattern.size() < path.size() && pattern.back() != "*")) {
-        return false;
-    }
-    for (std::size_t index = 0; index < pattern.size(); ++index) {
-        if (pattern[index] != "*" && pattern[index] != path[index]) {
-            return false;
-        }
-    }
-    return true;
-}
 
 bool HasWildcard(const Names& path)
 {
@@ -478,90 +460,6 @@ void VReferenceStore::SetFlags(const Names& path, std::uint32_t flags)
     record.Removed = false;
     if (!seen && committed) {
         RestoreFlags(path, flags);
-    }
-}
-
-std::vector<std::string> VReferenceStore::Commit()
-{
-    ++changeId;
-    std::vector<std::string> fired;
-    if (records.empty()) {
-        return fired;
-    }
-    std::set<std::string> kinds[5];
-    for (const auto& [path, record] : records) {
-        if (record.Removed) {
-            Listening(path, kinds[0]);
-        } else if (record.Verified) {
-            Listening(path, kinds[2]);
-        }
-        if (!record.Removed && record.Flags) {
-            Listening(path, kinds[3]);
-        }
-    }
-    for (const auto& [path, record] : records) {
-        Names touched = path;
-        if (record.Removed) {
-            pendingPaths.erase(path);
-            if (items.erase(path) == 0) {
-                continue;
-            }
-            const auto used = [&](const Names& prefix) {
-                return std::any_of(items.begin(), items.end(), [&](const auto& item) {
-                    return StartsWith(item.first, prefix);
-                });
-            };
-            while (!touched.empty() && !used(touched)) {
-                nodes.erase(touched);
-                touched.pop_back();
-            }
-        } else {
-            VItem& item = items[path];
-            if (record.Flags) {
-                MoveForFlags(item.Flags, *record.Flags, item.Proposed, item.Verified);
-                item.Flags = *record.Flags;
-            }
-            if (record.Proposed) {
-                item.Proposed = record.Proposed;
-            }
-            if (record.Verified) {
-                item.Verified = record.Verified;
-            }
-            if (item.Proposed && item.Proposed == item.Verified) {
-                pendingPaths.erase(path);
-            } else if (item.Proposed) {
-                pendingPaths.insert(path);
-            }
-        }
-        for (;; touched.pop_back()) {
-            nodes[touched] = changeId;
-            if (touched.empty()) {
-                break;
-            }
-        }
-    }
-    records.clear();
-    for (const Names& path : pendingPaths) {
-        Listening(path, kinds[1]);
-    }
-    const char* const words[] = {"removed ", "pending ", "verified ", "flags ", "any "};
-    for (int kind = 0; kind < 4; ++kind) {
-        kinds[4].insert(kinds[kind].begin(), kinds[kind].end());
-    }
-    for (int kind = 0; kind < 5; ++kind) {
-        for (const std::string& name : kinds[kind]) {
-            fired.push_back(words[kind] + name);
-        }
-    }
-    return fired;
-}
-
-void VReferenceStore::Listening(const Names& path, std::set<std::string>& names) const
-{
-    for (const Names& pattern : listenerPaths) {
-        if (NamesPath(pattern, path)) {
-            names.insert(Join(pattern));
-        }
     }
 }
 

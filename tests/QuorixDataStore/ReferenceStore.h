@@ -108,6 +108,15 @@ private:
         MaybeValue Value;
     };
 
+    /// Which paths of listeners fire, kind by kind.
+    struct VFiring
+    {
+        std::set<std::string> Removed;
+        std::set<std::string> Pending;
+        std::set<std::string> Verified;
+        std::set<std::string> Flags;
+    };
+
     static VReading Choose(std::uint32_t target, std::uint32_t flags, const MaybeValue& proposed,
                            const MaybeValue& verified);
     static void MoveForFlags(std::uint32_t from, std::uint32_t to, MaybeValue& proposed,
@@ -132,6 +141,11 @@ private:
     void EraseIfEmpty(const Names& path);
 
     std::string Read(const VStoreStep& step) const;
+
+    void CommitRemoval(const Names& path);
+    void CommitChange(const Names& path, const VRecord& record);
+    void Touch(Names path);
+    static std::vector<std::string> Lines(const VFiring& firing);
     void Listening(const Names& path, std::set<std::string>& names) const;
 
     const std::vector<Names> listenerPaths;
