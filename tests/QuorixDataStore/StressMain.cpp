@@ -6,14 +6,33 @@
 #include "DebugServices/Log.h"
 #include "StoreHistory.h"
 
+#include <charconv>
 #include <chrono>
+#include <cstdint>
 #include <cstdio>
-#include <cstdlib>
+#include <cstring>
+
+namespace {
+
+/// Reads an argument that is a whole number. @return whether it is one
+bool ReadNumber(const char* text, std::uint32_t& number)
+{
+    const char* const end = text + std::strlen(text);
+    const auto [read, error] = std::from_chars(text, end, number);
+    return error == std::errc() && read == end;
+}
+
+} // namespace
 
 int main(int argc, char** argv)
 {
-    const int seconds = argc > 1 ? std::atoi(argv[1]) : 60;
-    auto seed = static_cast<std::uint32_t>(argc > 2 ? std::atoi(argv[2]) : 1);
+    std::uint32_t seconds = 60;
+    std::uint32_t seed = 1;
+    if (argc > 3 || (argc > 1 && !ReadNumber(argv[1], seconds)) ||
+        (argc > 2 && !ReadNumber(argv[2], seed))) {
+        std::fprintf(stderr, "Usage: QuorixDataStoreStress [seconds] [first seed]\n");
+        return 2;
+    }
     DebugServices::SetLogLevel("DataStore", 0); // warnings of odd targets are part of the histories
 
     const auto end = std::chrono::steady_clock::now() + std::chrono::seconds(seconds);
