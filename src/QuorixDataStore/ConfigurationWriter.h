@@ -7,6 +7,7 @@
 #include "io/DataValue.h"
 
 #include <string>
+#include <string_view>
 #include <unordered_map>
 #include <vector>
 
@@ -29,22 +30,38 @@ private:
     using VWriterNode = UtilsRapidXml::VWriterNode;
     using VAttribute = DataStoreFileFormat::VAttributeDescription;
 
+    using VTokens = std::vector<VDataToken>;
+
+    /// Items that lie next to each other in the order of a file, at or below one path.
+    struct VRange
+    {
+        VTokens::const_iterator Begin;
+        VTokens::const_iterator End;
+        std::size_t Level; ///< the number of components that their paths share
+    };
+
+    VTokens FindItems() const;
     void WriteRoot(VWriterNode& node);
-    void WriteChildren(VWriterNode& parent);
-    void WriteNode(VWriterNode& node);
+    void WriteChildren(VWriterNode& parent, const VRange& items);
+    void WriteChild(VWriterNode& parent, const VRange& items);
+    void WriteNode(VWriterNode& node, const VRange& items);
     void WriteItem(VWriterNode& node);
     void WriteValues(VWriterNode& node, const KVR::IO::ISchema& schema);
     void WriteValue(VWriterNode& node, const VAttribute& attribute, const VDataValue& value,
                     const KVR::IO::ISchema& schema);
-    void WriteText(VWriterNode& node, const VAttribute& attribute, const std::string& text);
+    void WriteText(VWriterNode& node, const VAttribute& attribute, std::string_view value);
     void ReportUnwritten(VWriterNode& node, const VAttribute& attribute);
     const std::string& FormatOf(const KVR::IO::ISchema& schema);
 
     const IDataVerifyReader& reader;
     const UtilsRapidXml::IVersion version;
     VWriterNode root;
-    VDataPath path;   // of the node or item that is being written
-    VDataToken token; // of the item that is being written
+    const VDataToken* token = nullptr; // of an item at or below what is being written
+    std::size_t level = 0;             // of its components, how many name what is being written
     std::unordered_map<const KVR::IO::ISchema*, std::string> formats; // written before
-    std::string text;                                                 // keeps its room
+
+    // Of the item that is being written; kept for the room that they have.
+    VDataValue proposed;
+    VDataValue verified;
+    std::string text;
 };

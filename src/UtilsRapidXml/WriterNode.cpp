@@ -1,6 +1,5 @@
 #include "UtilsRapidXml/WriterNode.h"
 
-#include <cstring>
 #include <utility>
 
 namespace UtilsRapidXml {
@@ -8,10 +7,11 @@ namespace UtilsRapidXml {
 namespace {
 
 /// Copies a text into the document's memory; a text of no length is a valid one there too.
-char* Copy(rapidxml::xml_document<char>& document, const std::string& text)
+char* Copy(rapidxml::xml_document<char>& document, std::string_view text)
 {
     char* copy = document.allocate_string(nullptr, text.size() + 1);
-    std::memcpy(copy, text.c_str(), text.size() + 1);
+    text.copy(copy, text.size());
+    copy[text.size()] = 0;
     return copy;
 }
 
@@ -35,7 +35,7 @@ VWriterNode::VWriterNode(rapidxml::xml_node<char>& element, rapidxml::xml_docume
 {
 }
 
-bool VWriterNode::WriteAttribute(const std::string& name, const std::string& value,
+bool VWriterNode::WriteAttribute(std::string_view name, std::string_view value,
                                  const IVersion& first, const IVersion& last)
 {
     if (!IsSupported(global->Version, first, last)) {
@@ -45,14 +45,14 @@ bool VWriterNode::WriteAttribute(const std::string& name, const std::string& val
     return true;
 }
 
-void VWriterNode::AppendAttribute(rapidxml::xml_node<char>& to, const std::string& name,
-                                  const std::string& value)
+void VWriterNode::AppendAttribute(rapidxml::xml_node<char>& to, std::string_view name,
+                                  std::string_view value)
 {
     to.append_attribute(document.allocate_attribute(Copy(document, name), Copy(document, value),
                                                     name.size(), value.size()));
 }
 
-void VWriterNode::AddChildElement(const std::string& name, const ChildCallback& callback)
+void VWriterNode::AddChildElement(std::string_view name, const ChildCallback& callback)
 {
     rapidxml::xml_node<char>* child =
         document.allocate_node(rapidxml::node_element, Copy(document, name), nullptr, name.size());

@@ -7,6 +7,7 @@
 
 #include <memory>
 #include <string>
+#include <string_view>
 #include <vector>
 
 namespace UtilsRapidXml {
@@ -30,11 +31,11 @@ public:
     /// Appends an attribute with copies of both texts.
     ///
     /// @return false where the file's version leaves it out, without a message
-    bool WriteAttribute(const std::string& name, const std::string& value, const IVersion& first,
+    bool WriteAttribute(std::string_view name, std::string_view value, const IVersion& first,
                         const IVersion& last);
 
     /// Appends an element as the last child and hands it to the callback.
-    void AddChildElement(const std::string& name, const ChildCallback& callback);
+    void AddChildElement(std::string_view name, const ChildCallback& callback);
 
     void AddError(const std::string& text);
 
@@ -52,8 +53,8 @@ private:
     VWriterNode(rapidxml::xml_node<char>& element, rapidxml::xml_document<char>& document,
                 std::shared_ptr<VGlobalInfo> global);
 
-    void AppendAttribute(rapidxml::xml_node<char>& to, const std::string& name,
-                         const std::string& value);
+    void AppendAttribute(rapidxml::xml_node<char>& to, std::string_view name,
+                         std::string_view value);
 
     rapidxml::xml_node<char>& element;
     rapidxml::xml_document<char>& document; // whose memory everything lies in
