@@ -47,7 +47,6 @@ Item {
         text: "Control on '" + authorizationDialog.clientName + "' is requesting a connection."
         // The name is a device's: no markup in it is ever rendered.
         textFormat: Text.PlainText
-        font: Theme.font
         color: Theme.text
         horizontalAlignment: Text.AlignLeft
         wrapMode: Text.Wrap

@@ -26,7 +26,6 @@ Item {
             margins: Theme.margin
         }
         text: "Known Control devices:"
-        font: Theme.font
         color: Theme.text
         elide: Text.ElideRight
     }
@@ -185,7 +184,6 @@ Item {
                 text: itemName
                 // The name is a device's: no markup in it is ever rendered.
                 textFormat: Text.PlainText
-                font: Theme.font
                 color: Theme.text
                 horizontalAlignment: Text.AlignLeft
                 maximumLineCount: 1

@@ -33,6 +33,6 @@ QtObject {
 
     readonly property SystemPalette palette: SystemPalette {}
     readonly property FontMetrics metrics: FontMetrics {
-        font.pointSize: 10
+        font: Qt.application.font
     }
 }
