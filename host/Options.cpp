@@ -29,7 +29,9 @@ const char* const footer =
     "  add N                               a camera appears\n"
     "  remove N                            a camera goes\n"
     "  notify CLASS ID PARAMETER COUNT     fires the parameter's change notification COUNT times\n"
+    "  answer ANSWER [remember|forget]     allow, deny or cancel, in the dialog that is open\n"
     "  fire EVENT [NAME=VALUE]...          publishes an event; quotes keep a value's blanks\n"
+    "  clock +MS                           moves the clock forward that beats are measured by\n"
     "  state                               the host's state as JSON\n"
     "  locks                               who holds and who waits for the data store, as JSON\n"
     "  quit                                stops the host in order\n"
@@ -82,7 +84,9 @@ VCommandLine ParseCommandLine(int argumentCount, const char* const* arguments, s
     application.add_option("--cameras", options.cameras, "Number of simulated cameras, default 4")
         ->type_name("N")
         ->check(CLI::Range(0U, maximumCameras).description(""));
-    application.add_flag("--headless", options.headless, "No window")->disable_flag_override();
+    application
+        .add_flag("--headless", options.headless, "No window; without this a display is needed")
+        ->disable_flag_override();
     application
         .add_option("--data", options.dataFolder,
                     "Folder of the host's files, made where it is missing; default: quorix in the "
