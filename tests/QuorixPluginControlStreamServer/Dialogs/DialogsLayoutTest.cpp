@@ -150,11 +150,12 @@ protected:
 
 } // namespace
 
-INSTANTIATE_TEST_SUITE_P(Names, DialogLayout, testing::ValuesIn(layoutCases), [](const auto& info) {
-    std::string name = info.param.name;
-    std::replace(name.begin(), name.end(), '-', '_');
-    return name;
-});
+INSTANTIATE_TEST_SUITE_P(Names, DialogLayout, testing::ValuesIn(layoutCases),
+                         [](const auto& named) {
+                             std::string name = named.param.name;
+                             std::replace(name.begin(), name.end(), '-', '_');
+                             return name;
+                         });
 
 TEST_P(DialogLayout, ShowsTheWholeQuestion)
 {
@@ -195,7 +196,7 @@ TEST_P(DialogLayout, PutsTheDenyingButtonInTheCorner)
 }
 
 INSTANTIATE_TEST_SUITE_P(Sets, ManagementLayout, testing::Bool(),
-                         [](const auto& info) { return info.param ? "Dark" : "Light"; });
+                         [](const auto& named) { return named.param ? "Dark" : "Light"; });
 
 TEST_P(ManagementLayout, ShowsAnEmptyList)
 {

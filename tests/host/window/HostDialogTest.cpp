@@ -101,7 +101,7 @@ class HostDialogOutcome : public HostDialog, public testing::WithParamInterface<
 } // namespace
 
 INSTANTIATE_TEST_SUITE_P(Answers, HostDialogOutcome, testing::ValuesIn(outcomeCases),
-                         [](const auto& info) { return std::string(info.param.name); });
+                         [](const auto& named) { return std::string(named.param.name); });
 
 TEST_P(HostDialogOutcome, ComesBackToTheDevice)
 {
