@@ -36,7 +36,10 @@ class QuorixHost:
             "XDG_RUNTIME_DIR": self._folder.name,
             "QT_QPA_PLATFORM": "offscreen",
             "QT_QUICK_BACKEND": "software",
+            # What a test advertises must not reach the machine's own network.
+            "DBUS_SYSTEM_BUS_ADDRESS": "unix:path=/nonexistent/bus",
         }
+        self._errors = tempfile.TemporaryFile()
         program = program or os.environ["QUORIX_HOST_PROGRAM"]
         options = ["--console", "--data", self._folder.name, *arguments]
         if not window:
@@ -45,15 +48,17 @@ class QuorixHost:
             [*launcher, program, *options],
             stdin=subprocess.PIPE,
             stdout=subprocess.PIPE,
-            stderr=subprocess.DEVNULL,
+            stderr=self._errors,
             env=environment,
             text=True,
         )
         self._lines: "queue.Queue[str]" = queue.Queue()
         threading.Thread(target=self._read, daemon=True).start()
         if self._next_line() != "ready":
+            self._errors.seek(0)
+            errors = self._errors.read().decode(errors="replace")
             self.kill()
-            raise RuntimeError("the host did not get ready")
+            raise RuntimeError(f"the host did not get ready: {errors[-3000:]}")
 
     def _read(self) -> None:
         assert self._process.stdout is not None
@@ -100,6 +105,7 @@ class QuorixHost:
         for pipe in (self._process.stdin, self._process.stdout):
             assert pipe is not None
             pipe.close()
+        self._errors.close()
         self._folder.cleanup()
 
     def __enter__(self) -> QuorixHost:
