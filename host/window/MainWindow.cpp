@@ -26,6 +26,7 @@
 #include <QTableView>
 #include <QTimer>
 #include <QVBoxLayout>
+#include <QWindow>
 
 #include <utility>
 
@@ -34,6 +35,7 @@ namespace {
 
 constexpr int refusalShownMilliseconds = 8000;
 constexpr int tickMilliseconds = 1000;
+constexpr int mostRowsMeasured = 50; // for the width of a column, at each change
 constexpr QSize firstSize(1360, 720);
 constexpr int firstPanelWidth = 460;
 
@@ -48,6 +50,7 @@ QTableView* MakeTable(QAbstractItemModel* model, const char* name)
     table->verticalHeader()->hide();
     table->horizontalHeader()->setStretchLastSection(true);
     table->horizontalHeader()->setHighlightSections(false);
+    table->horizontalHeader()->setResizeContentsPrecision(mostRowsMeasured);
     return table;
 }
 
@@ -185,6 +188,15 @@ void VMainWindow::ShowWaiting(bool isWaiting)
     badge->setVisible(isWaiting);
 }
 
+void VMainWindow::BringAbove(const QWidget& dialog)
+{
+    // The plug-in's question has no parent, and a window manager might leave it behind this window.
+    if (dialog.windowHandle() != nullptr) {
+        dialog.windowHandle()->setTransientParent(windowHandle());
+    }
+    QApplication::alert(this);
+}
+
 void VMainWindow::closeEvent(QCloseEvent* event)
 {
     event->ignore(); // the window goes when the host has stopped
@@ -196,7 +208,11 @@ bool VMainWindow::eventFilter(QObject* object, QEvent* event)
     if (event->type() == QEvent::Show || event->type() == QEvent::Hide) {
         const auto* const dialog = qobject_cast<const QDialog*>(object);
         if (dialog != nullptr && IsQuestion(*dialog)) {
-            ShowWaiting(event->type() == QEvent::Show);
+            const bool comes = event->type() == QEvent::Show;
+            ShowWaiting(comes);
+            if (comes) {
+                BringAbove(*dialog);
+            }
         }
     }
     return QMainWindow::eventFilter(object, event);

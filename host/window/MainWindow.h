@@ -51,6 +51,7 @@ private:
     void AddMenus();
     void RefreshTapToSelect();
     void OnTick();
+    void BringAbove(const QWidget& dialog);
 
     VHost& host;
     const boost::function<void()> requestStop;

@@ -19,6 +19,7 @@
 #include <QStatusBar>
 #include <QTableView>
 #include <QTemporaryDir>
+#include <QWindow>
 
 using QuorixHost::VCameraModel;
 using QuorixHost::VConnectionModel;
@@ -216,6 +217,7 @@ TEST_F(HostWindow, BearsABadgeWhileADeviceWaits)
     question.show();
     EXPECT_TRUE(badge.isVisible());
     EXPECT_EQ("A device waits for an answer", badge.text());
+    EXPECT_EQ(Window().windowHandle(), question.windowHandle()->transientParent());
     KeepPicture("window-waiting");
     question.done(0);
 
