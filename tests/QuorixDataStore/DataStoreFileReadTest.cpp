@@ -118,7 +118,7 @@ TEST_P(ConfigurationMessages, AreAllReportedByOneLoad)
 }
 
 INSTANTIATE_TEST_SUITE_P(Documents, ConfigurationMessages, testing::ValuesIn(messageCases),
-                         [](const auto& info) { return std::string(info.param.Name); });
+                         [](const auto& named) { return std::string(named.param.Name); });
 
 TEST(ReadConfiguration, LogsWarningsAndThenErrors)
 {

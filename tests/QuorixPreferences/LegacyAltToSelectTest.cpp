@@ -67,6 +67,6 @@ TEST_P(LegacyAltToSelect, IsFoundOnlyAsAString)
 }
 
 INSTANTIATE_TEST_SUITE_P(Documents, LegacyAltToSelect, testing::ValuesIn(legacyCases),
-                         [](const auto& info) { return std::string(info.param.Name); });
+                         [](const auto& named) { return std::string(named.param.Name); });
 
 } // namespace

@@ -53,7 +53,7 @@ TEST_P(WindowsPathText, IsRelativeOrGetsItsPrefix)
 }
 
 INSTANTIATE_TEST_SUITE_P(Paths, WindowsPathText, testing::ValuesIn(pathCases),
-                         [](const auto& info) { return std::string(info.param.Name); });
+                         [](const auto& named) { return std::string(named.param.Name); });
 
 struct VNameCase
 {

@@ -110,7 +110,7 @@ const VDecisionCase decisionCases[] = {
 // clang-format on
 
 INSTANTIATE_TEST_SUITE_P(Table, FakeOperator, testing::ValuesIn(decisionCases),
-                         [](const auto& info) { return std::string(info.param.Name); });
+                         [](const auto& named) { return std::string(named.param.Name); });
 
 TEST(FakeOperator, ThatNeverAnswersHoldsThePlaceUntilTheRequestIsTakenBack)
 {

@@ -140,7 +140,7 @@ const VFaultCase faultCases[] = {
 // clang-format on
 
 INSTANTIATE_TEST_SUITE_P(Table, Fault, testing::ValuesIn(faultCases),
-                         [](const auto& info) { return std::string(info.param.Name); });
+                         [](const auto& named) { return std::string(named.param.Name); });
 
 /// The asynchronous client against the same faults: it finds the sound connection by itself.
 class FaultAsync : public testing::TestWithParam<VFaultCase>
@@ -172,7 +172,7 @@ TEST_P(FaultAsync, IsToldWhereEveryConnectionHasIt)
 }
 
 INSTANTIATE_TEST_SUITE_P(Table, FaultAsync, testing::ValuesIn(faultCases),
-                         [](const auto& info) { return std::string(info.param.Name); });
+                         [](const auto& named) { return std::string(named.param.Name); });
 
 TEST(FaultNeverRead, FillsTheNetworkAndTheSendingTimesOut)
 {

@@ -126,7 +126,7 @@ const VRefusalCase refusalCases[] = {
 // clang-format on
 
 INSTANTIATE_TEST_SUITE_P(Table, LintRefusal, testing::ValuesIn(refusalCases),
-                         [](const auto& info) { return std::string(info.param.Name); });
+                         [](const auto& named) { return std::string(named.param.Name); });
 
 struct VWarningCase
 {
@@ -174,7 +174,7 @@ const VWarningCase warningCases[] = {
 // clang-format on
 
 INSTANTIATE_TEST_SUITE_P(Table, LintWarning, testing::ValuesIn(warningCases),
-                         [](const auto& info) { return std::string(info.param.Name); });
+                         [](const auto& named) { return std::string(named.param.Name); });
 
 /// Every seed of the fuzz target for the server's parsers, and what it becomes by losing bytes.
 TEST(Lint, AgreesWithTheServerOnAllThatFuzzingBeganWith)

@@ -158,7 +158,7 @@ const VFaultSwitch faultSwitches[] = {
 // clang-format on
 
 INSTANTIATE_TEST_SUITE_P(Table, ProgramServeFault, testing::ValuesIn(faultSwitches),
-                         [](const auto& info) { return std::string(info.param.Name); });
+                         [](const auto& named) { return std::string(named.param.Name); });
 
 struct VWrongUsage
 {
@@ -196,7 +196,7 @@ const VWrongUsage wrongUsages[] = {
 // clang-format on
 
 INSTANTIATE_TEST_SUITE_P(Table, ProgramToolsUsage, testing::ValuesIn(wrongUsages),
-                         [](const auto& info) { return std::string(info.param.Name); });
+                         [](const auto& named) { return std::string(named.param.Name); });
 
 TEST(ProgramRecord, StandsBetweenADeviceAndItsHostAndBothCanBeReplayed)
 {

@@ -92,6 +92,6 @@ const VFaultyRecording faultyRecordings[] = {
 // clang-format on
 
 INSTANTIATE_TEST_SUITE_P(Table, FaultyRecording, testing::ValuesIn(faultyRecordings),
-                         [](const auto& info) { return std::string(info.param.Name); });
+                         [](const auto& named) { return std::string(named.param.Name); });
 
 } // namespace
