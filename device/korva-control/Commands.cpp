@@ -14,6 +14,7 @@ std::vector<std::unique_ptr<ICommand>> MakeCommands()
     commands.push_back(MakeCommandAuthorize());
     commands.push_back(MakeCommandWatch());
     commands.push_back(MakeCommandRaw());
+    commands.push_back(MakeCommandShell());
     commands.push_back(MakeCommandRecord());
     commands.push_back(MakeCommandReplay());
     commands.push_back(MakeCommandBench());

@@ -19,6 +19,7 @@ std::unique_ptr<ICommand> MakeCommandRun();
 std::unique_ptr<ICommand> MakeCommandAuthorize();
 std::unique_ptr<ICommand> MakeCommandWatch();
 std::unique_ptr<ICommand> MakeCommandRaw();
+std::unique_ptr<ICommand> MakeCommandShell();
 std::unique_ptr<ICommand> MakeCommandRecord();
 std::unique_ptr<ICommand> MakeCommandReplay();
 std::unique_ptr<ICommand> MakeCommandBench();
