@@ -19,6 +19,7 @@
 #include <system_error>
 #include <thread>
 #include <utility>
+#include <vector>
 
 // The plug-in as a host meets it: the built library, its two functions, and the real port.
 
@@ -73,7 +74,7 @@ private:
     void* handle;
 };
 
-/// A host that supplies what a test gives it.
+/// A host that supplies what a test gives it, and notes what it is asked for.
 class VFakeHost : public QuorixPluginInterface::IHost
 {
 public:
@@ -86,17 +87,34 @@ public:
     std::shared_ptr<TestSupport::VFakeCameraSettings> Settings;
     std::shared_ptr<KVR::IPostalService> PostalService;
     std::shared_ptr<TestSupport::VFakeCameraSelection> Selection;
+    std::vector<std::string> Asked; ///< the services, in order
 
-    std::shared_ptr<IDataStore> GetStore() override { return Store; }
-    std::shared_ptr<ICameraSettingsSource> GetCameraSettingsSource() override { return Settings; }
-    std::shared_ptr<KVR::IPostalService> GetPostalService() override { return PostalService; }
+    std::shared_ptr<IDataStore> GetStore() override { return Noted("Store", Store); }
+    std::shared_ptr<ICameraSettingsSource> GetCameraSettingsSource() override
+    {
+        return Noted("CameraSettingsSource", Settings);
+    }
+    std::shared_ptr<KVR::IPostalService> GetPostalService() override
+    {
+        return Noted("PostalService", PostalService);
+    }
     std::shared_ptr<ICameraSelectionSource> GetCameraSelectionSource() override
     {
-        return Selection;
+        return Noted("CameraSelectionSource", Selection);
     }
-    std::shared_ptr<IControlSystem> GetControlSystem() override { return controlSystem; }
+    std::shared_ptr<IControlSystem> GetControlSystem() override
+    {
+        return Noted("ControlSystem", controlSystem);
+    }
 
 private:
+    template <typename TService>
+    std::shared_ptr<TService> Noted(const char* name, const std::shared_ptr<TService>& service)
+    {
+        Asked.emplace_back(name);
+        return service;
+    }
+
     const std::shared_ptr<IControlSystem> controlSystem;
 };
 

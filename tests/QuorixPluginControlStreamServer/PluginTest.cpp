@@ -197,6 +197,14 @@ TEST_F(Plugin, RegistersItsProvidersInOrderAndStopTakesThemBack)
     EXPECT_THAT(controlSystem->EventProviders(), IsEmpty());
 }
 
+TEST_F(Plugin, AsksForTheHostsServicesInOrder)
+{
+    plugin->Start(host);
+
+    EXPECT_THAT(host.Asked, ElementsAre("ControlSystem", "Store", "CameraSettingsSource",
+                                        "CameraSelectionSource", "PostalService"));
+}
+
 TEST_F(Plugin, ItsCommandsReachTheHostsTwoCameraSources)
 {
     host.Settings = std::make_shared<TestSupport::VFakeCameraSettings>();

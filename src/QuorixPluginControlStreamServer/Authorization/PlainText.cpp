@@ -16,6 +16,9 @@ namespace {
 // twenty seconds, and nobody has been asked yet. No name for people is longer than this.
 constexpr std::size_t longestMarkup = 4096;
 
+// Without markup it takes next to none, up to what a text of Qt holds.
+constexpr std::size_t longestText = std::size_t{1} << 20;
+
 /// A document that loads nothing. A plain one opens what the text names while it reads the text: a
 /// style sheet in a pipe would stop the thread for good, and a background picture ends a process
 /// that has no windows.
@@ -50,7 +53,7 @@ std::wstring ToWide(const QString& text)
 std::wstring Shortened(const std::wstring& text)
 {
     const bool hasMarkup = text.find(L'<') != std::wstring::npos;
-    return hasMarkup ? text.substr(0, longestMarkup) : text;
+    return text.substr(0, hasMarkup ? longestMarkup : longestText);
 }
 
 bool BelongsToTagName(wchar_t unit)

@@ -49,17 +49,21 @@ VDataToken ControlToken(const std::string& deviceId, const char* item)
 }
 
 /// Runs one of the last steps, each of which must not keep the next from running.
+///
+/// @return whether it was done
 template <typename TStep>
-void RunLastStep(const char* name, TStep step)
+bool RunLastStep(const char* name, TStep step)
 {
     try {
         step();
+        return true;
     } catch (const std::exception& exception) {
         KVR_LOG("Authorization", 2, "At the end of the authorization, %1% failed: %2%", name,
                 exception.what());
     } catch (...) {
         KVR_LOG("Authorization", 2, "At the end of the authorization, %1% failed", name);
     }
+    return false;
 }
 
 } // namespace
@@ -80,16 +84,19 @@ VQuorixControlAuthorization::VQuorixControlAuthorization(
 VQuorixControlAuthorization::~VQuorixControlAuthorization()
 {
     // No step and no check runs any more, since each holds this object.
-    RunLastStep("telling the devices", [this] { disconnected(); });
+    (void)RunLastStep("telling the devices", [this] { disconnected(); });
 
     std::string allowed;
     std::string banned;
-    RunLastStep("making the lists", [this, &allowed, &banned] {
+    const bool made = RunLastStep("making the lists", [this, &allowed, &banned] {
         const Lock lock(mutex);
         allowed = ControlLists::Write(devices, true);
         banned = ControlLists::Write(devices, false);
     });
-    RunLastStep("writing the lists", [this, &allowed, &banned] { WriteDevices(allowed, banned); });
+    if (made) { // else those that are stored are the better ones
+        (void)RunLastStep("writing the lists",
+                          [this, &allowed, &banned] { WriteDevices(allowed, banned); });
+    }
 }
 
 VControlDevices VQuorixControlAuthorization::ReadDevices() const

@@ -1,4 +1,5 @@
 #include "AuthorizationBench.h"
+#include "QuorixPluginControlStreamServer/Authorization/ControlDeviceNames.h"
 #include "support/LogCapture.h"
 
 #include <boost/asio/ip/host_name.hpp>
@@ -36,6 +37,15 @@ TEST(ControlAuthorizationInterface, KeepsTheOrderOfItsSlots)
     EXPECT_EQ(7U, SlotOf(&IControlAuthorization::IsRequestPending));
     EXPECT_EQ(0U, SlotOf(&IQuorixControlAuthorizationGUI::Ask));
     EXPECT_EQ(1U, SlotOf(&IQuorixControlAuthorizationGUI::Cancel));
+}
+
+TEST(ControlDeviceNames, AreTheHostsOwn)
+{
+    EXPECT_STREQ("ControlDevice", ControlDeviceNames::device);
+    EXPECT_STREQ("ControlDeviceName", ControlDeviceNames::name);
+    EXPECT_STREQ("ControlDeviceSelected", ControlDeviceNames::selected);
+    EXPECT_STREQ("ControlDeviceConnected", ControlDeviceNames::connected);
+    EXPECT_STREQ("ControlDeviceAuthorized", ControlDeviceNames::authorized);
 }
 
 TEST_F(ControlAuthorization, StartsWithNothing)

@@ -116,11 +116,12 @@ TEST(PlainText, MarkupBeyondAllNamesIsCutOff)
     EXPECT_EQ(std::string(4093, 'x'), RichTextToPlainText("<b>" + std::string(4094, 'x')));
 }
 
-TEST(PlainText, ALongNameWithoutMarkupStaysWhole)
+TEST(PlainText, ALongNameWithoutMarkupStaysWholeUpToAMebi)
 {
     const std::string name(100000, 'x');
 
-    EXPECT_EQ(name, RichTextToPlainText(name));
+    EXPECT_TRUE(name == RichTextToPlainText(name)); // too long to be shown
+    EXPECT_EQ(1048576U, RichTextToPlainText(std::string(3000000, 'x')).size());
 }
 
 TEST(PlainText, DeepMarkupEndsSoon)
@@ -130,6 +131,6 @@ TEST(PlainText, DeepMarkupEndsSoon)
          {"<b>", "<div>", "<img src=x>", "<table><tr><td>", "<ul><li>", "<style>p{}</style>"}) {
         const auto begin = std::chrono::steady_clock::now();
         RichTextToPlainText(Repeated(tag, 100000));
-        EXPECT_LT(std::chrono::steady_clock::now() - begin, std::chrono::seconds(20)) << tag;
+        EXPECT_LT(std::chrono::steady_clock::now() - begin, std::chrono::seconds(60)) << tag;
     }
 }
