@@ -172,6 +172,13 @@ class AskedOperator(unittest.IsolatedAsyncioTestCase):
         self.assertEqual("ok", await loop.run_in_executor(None, self.host.command, answer))
         return await asyncio.wait_for(asking, LIMIT)
 
+    async def ask_again(self, name: str) -> Authorization:
+        """An outcome is told a moment before its request is over; until then it is "Connected"."""
+        outcome = await self.client.authorize("desk-7", name)
+        while outcome.status == "Connected":
+            outcome = await self.client.authorize("desk-7", name)
+        return outcome
+
     async def test_who_denies(self) -> None:
         outcome = await self.ask_and("answer deny forget")
         self.assertEqual("Failed", outcome.status)
@@ -179,14 +186,14 @@ class AskedOperator(unittest.IsolatedAsyncioTestCase):
 
     async def test_who_allows_and_remembers(self) -> None:
         self.assertTrue((await self.ask_and("answer allow remember")).granted)
-        again = await self.client.authorize("desk-7", "Another name")
+        again = await self.ask_again("Another name")
         self.assertEqual("Authorized", again.status)
         self.assertIsNone(self.host.state()["dialog"])
 
     async def test_who_bans(self) -> None:
         self.assertEqual("Failed", (await self.ask_and("answer deny remember")).status)
         with self.client.listen("Event.Authorize") as events:
-            again = await self.client.authorize("desk-7", "Light desk")
+            again = await self.ask_again("Light desk")
             self.assertEqual("Failed", again.status)
             await self.client.commands()
             with self.assertRaises(TimedOutError):
