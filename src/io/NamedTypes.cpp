@@ -46,7 +46,7 @@ public:
 
     bool Resolve(ISchema& schema, std::size_t level)
     {
-        if (level > mostLevels || ++parts > mostParts) {
+        if (!openNames.empty() && (level > mostLevels || ++partsOfTypes > mostParts)) {
             return false;
         }
         if (schema.Type != EType::Ref) {
@@ -90,7 +90,7 @@ private:
 
     const std::vector<ISchema>& dictionary;
     std::vector<std::string> openNames;
-    std::size_t parts = 0;
+    std::size_t partsOfTypes = 0; // what is written out in the schema itself is not counted
 };
 
 } // namespace

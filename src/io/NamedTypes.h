@@ -22,8 +22,8 @@ std::size_t ExtractNamedTypes(ISchema& schema, std::vector<ISchema>& dictionary,
 /// Puts the types of a dictionary back in place of each `Ref` in a schema, at any depth.
 ///
 /// @return false, with the schema partly resolved, if the dictionary lacks a name, if a type holds
-///         itself, and for what no program means: more than 256 levels or 2^16 parts, of which a
-///         short dictionary can ask for any number [any]
+///         itself, and for what no program means: types that lead to more than 256 levels or have
+///         more than 2^16 parts, of which a short dictionary can ask for any number [any]
 bool ResolveNamedTypes(ISchema& schema, const std::vector<ISchema>& dictionary);
 
 } // namespace IO

@@ -226,6 +226,21 @@ TEST(NamedTypes, OfALongDictionaryCannotAskForEndlessLevels)
     EXPECT_FALSE(ResolveNamedTypes(deep, chain));
 }
 
+TEST(NamedTypes, OfALargeSchemaAreResolvedWhateverItsSize)
+{
+    ISchema wide = Plain(EType::Tuple);
+    wide.SubSchemas.assign(70000, {std::string(), Plain(EType::Bool)});
+    wide.SubSchemas.emplace_back(std::string(), RefTo("A"));
+    ISchema deep = ListOf(Plain(EType::Bool));
+    for (int i = 0; i < 300; ++i) {
+        deep = TupleOf({deep});
+    }
+
+    EXPECT_TRUE(ResolveNamedTypes(wide, {Named("A", Plain(EType::Int8))}));
+    EXPECT_EQ(EType::Int8, wide.SubSchemas.back().second.Type);
+    EXPECT_TRUE(ResolveNamedTypes(deep, {}));
+}
+
 TEST(NamedTypes, OfRandomSchemasComeBackWhole)
 {
     VRandomSchema::Limits limits;
