@@ -2,14 +2,12 @@
 #include "QuorixPluginInterface/IPanelService.h"
 #include "host/window/WindowSupport.h"
 #include "support/LogCapture.h"
-#include "window/GuiSignal.h"
 #include "window/PanelService.h"
 
 #include <QDialog>
 #include <QPointer>
 
 #include <stdexcept>
-#include <thread>
 
 using TestSupport::MenuItem;
 
@@ -128,40 +126,4 @@ TEST_F(HostPanels, DestroysOpenPanelsBeforeThePluginGoes)
     window->ClosePanels();
 
     EXPECT_TRUE(open.isNull());
-}
-
-TEST(GuiSignal, CallsOnTheEventLoopOnceForSeveralWishes)
-{
-    int calls = 0;
-    std::thread::id caller;
-    const QuorixHost::VGuiSignal signal([&] {
-        ++calls;
-        caller = std::this_thread::get_id();
-    });
-
-    std::thread([wake = signal.Waker()] {
-        wake();
-        wake();
-    }).join();
-    EXPECT_EQ(0, calls);
-
-    EXPECT_TRUE(QTest::qWaitFor([&] { return calls > 0; }));
-    EXPECT_EQ(1, calls);
-    EXPECT_EQ(std::this_thread::get_id(), caller);
-}
-
-TEST(GuiSignal, IsSilentAfterItsEnd)
-{
-    boost::function<void()> wake;
-    int calls = 0;
-    {
-        const QuorixHost::VGuiSignal signal([&] { ++calls; });
-        wake = signal.Waker();
-        wake();
-    }
-
-    std::thread(wake).join();
-    QCoreApplication::processEvents();
-
-    EXPECT_EQ(0, calls);
 }
