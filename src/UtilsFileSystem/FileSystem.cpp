@@ -25,6 +25,15 @@ boost::filesystem::file_status StatusOf(const boost::filesystem::path& path)
     return boost::filesystem::status(path, error);
 }
 
+void RequirePathText(const boost::filesystem::path& path)
+{
+    if (!IsPathText(path.native())) {
+        throw boost::filesystem::filesystem_error(
+            "a path with a zero byte",
+            boost::system::error_code(EINVAL, boost::system::system_category()));
+    }
+}
+
 /// Makes the folders. Throws where one cannot be made.
 void CreateFolders(const boost::filesystem::path& path)
 {
@@ -35,11 +44,7 @@ void CreateFolders(const boost::filesystem::path& path)
             "boost::filesystem::create_directories",
             boost::system::error_code(ENAMETOOLONG, boost::system::system_category()));
     }
-    if (!IsPathText(path.native())) {
-        throw boost::filesystem::filesystem_error(
-            "boost::filesystem::create_directories",
-            boost::system::error_code(EINVAL, boost::system::system_category()));
-    }
+    RequirePathText(path);
     boost::filesystem::create_directories(path);
 }
 
@@ -119,6 +124,7 @@ void ForEachFile(const boost::filesystem::path& folder,
                  const boost::function<void(const boost::filesystem::path&)>& operation)
 {
     try {
+        RequirePathText(folder);
         for (const auto& entry : boost::filesystem::directory_iterator(folder)) {
             if (boost::filesystem::is_regular_file(StatusOf(entry.path())) &&
                 !RunOn(folder, entry.path(), operation)) {

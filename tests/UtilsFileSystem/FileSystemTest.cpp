@@ -9,6 +9,7 @@
 #include <set>
 #include <stdexcept>
 #include <sys/stat.h>
+#include <unistd.h>
 
 using namespace UtilsFileSystem;
 using testing::ElementsAre;
@@ -52,6 +53,33 @@ TEST(FileSystem, APathWithAZeroNamesNothing)
     EXPECT_FALSE(FolderExists(std::string("/tmp\0", 5)));
     EXPECT_FALSE(FileExists(std::string("/etc/passwd\0", 12)));
     EXPECT_EQ(log.Texts("UtilsFileSystem").size(), 1U);
+}
+
+TEST(FileSystem, AFolderWithAZeroInItsNameIsNotWalked)
+{
+    const VTemporaryFolder folder;
+    const VLogCapture log;
+    WriteFile(folder.Path("file"), "");
+
+    ForEachFile(folder.Path() + std::string("\0x", 2),
+                [](const boost::filesystem::path&) { ADD_FAILURE() << "called"; });
+
+    EXPECT_EQ(log.Texts("UtilsFileSystem").size(), 1U);
+}
+
+TEST(FileSystem, WhatCannotBeAskedForIsNeitherFileNorFolderAndIsTriedToBeMade)
+{
+    const VTemporaryFolder folder;
+    const VLogCapture log;
+    const std::string loop = folder.Path("loop");
+    ASSERT_EQ(symlink("loop", loop.c_str()), 0);
+
+    EXPECT_FALSE(FileExists(loop));
+    EXPECT_FALSE(FolderExists(loop));
+    EnsureFolder(loop);
+
+    ASSERT_EQ(log.Texts("UtilsFileSystem").size(), 1U);
+    EXPECT_THAT(log.Messages()[0].Text, StartsWith("Unable to create path " + loop + ": "));
 }
 
 TEST(FileSystem, OpensThroughStreams)
