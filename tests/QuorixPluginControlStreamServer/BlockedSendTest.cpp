@@ -89,4 +89,44 @@ TEST_F(BlockedSend, DoesNotKeepTheConnectionFromReading)
     connection->Close();
 }
 
+/// A device that sends without end, whose messages are not read any more.
+class LastBytes : public VConnectionFixture
+{
+protected:
+    LastBytes() : client(socket->Port(), SmallBuffer), connection(ConnectionOf(0).lock())
+    {
+        onMessage = [this](const std::shared_ptr<IClientConnection>&) { held.Wait(); };
+        client.SendFrame("holds the reading");
+        client.SendFrame("unread");
+    }
+
+    ~LastBytes() override { held.Open(); }
+
+    VLatch held;
+    VRawClient client;
+    std::shared_ptr<IClientConnection> connection;
+};
+
+TEST_F(LastBytes, ReachADeviceThatSendsWhileItsConnectionIsClosed)
+{
+    const std::string text(std::size_t{64} * 1024, 'x'); // more than the device's own buffer holds
+    connection->Send(std::wstring(text.begin(), text.end()));
+    std::thread closing([this] { connection->Close(); });
+
+    EXPECT_EQ(text, client.ReadFrame());
+
+    EXPECT_EQ("", client.ReadToEnd());
+    closing.join();
+}
+
+TEST_F(LastBytes, AreLeftToTheSystemWhereTheDeviceDoesNotReadThem)
+{
+    const std::string text(std::size_t{64} * 1024, 'x');
+    connection->Send(std::wstring(text.begin(), text.end()));
+
+    connection->Close(); // returns
+
+    EXPECT_EQ(text, client.ReadFrame());
+}
+
 } // namespace

@@ -1,5 +1,6 @@
 #include "QuorixPluginControlStreamServer/ControlStreamServer/ClientConnectionASIO.h"
 
+#include "QuorixPluginControlStreamServer/ControlStreamServer/LastBytes.h"
 #include "utils/WideText.h"
 
 #include <boost/asio/buffer.hpp>
@@ -134,14 +135,28 @@ void VClientConnectionASIO::Close()
         }
         // Closing alone would leave a writer blocked, and this call with it. An error says that the
         // device has gone already.
-        static_cast<void>(::shutdown(socket->native_handle(), SHUT_RDWR));
+        static_cast<void>(::shutdown(socket->native_handle(), SHUT_WR));
     }
-    KVR::VMutexLock lock(mutex);
+    KVR::VMutexLock lock(mutex); // keeps the socket from being closed by another call meanwhile
+    AwaitLastBytesOfSocket();
     KVR::VMutexLock socketLock(socketMutex);
     const std::shared_ptr<tcp::socket> closed = std::move(socket);
     if (closed) {
         closed->close();
     }
+}
+
+void VClientConnectionASIO::AwaitLastBytesOfSocket()
+{
+    int descriptor = -1;
+    {
+        KVR::VMutexLock socketLock(socketMutex);
+        if (!socket) {
+            return;
+        }
+        descriptor = socket->native_handle();
+    }
+    AwaitLastBytes(descriptor, lastBytesLimit);
 }
 
 VClientConnectionASIO::~VClientConnectionASIO() noexcept(false)

@@ -35,6 +35,8 @@ public:
     VClientConnectionASIO(const VClientConnectionASIO&) = delete;
     VClientConnectionASIO& operator=(const VClientConnectionASIO&) = delete;
 
+    /// Ends the stream and closes the socket. Waits a second at most for the device's system to
+    /// take what was sent, where it has not yet.
     void Close() override;
     void Send(const std::wstring& message) override;
     MessageCallback& GetMessageCallback() override { return messageCallback; }
@@ -68,6 +70,9 @@ private:
     void OnHeader();
     void OnBody();
     void Deliver();
+
+    /// Waits, with a limit, until what was written has left for the device.
+    void AwaitLastBytesOfSocket() KVR_REQUIRES(mutex);
 
     KVR::VMutex mutex; // serialises Send; lock order: this one, then socketMutex
     // Guards the socket's handle and the start of every read, which a close beside it would race

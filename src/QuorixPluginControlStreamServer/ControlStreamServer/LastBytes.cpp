@@ -1,0 +1,46 @@
+#include "QuorixPluginControlStreamServer/ControlStreamServer/LastBytes.h"
+
+#include <array>
+#include <cerrno>
+
+#include <linux/sockios.h>
+#include <poll.h>
+#include <sys/ioctl.h>
+#include <sys/socket.h>
+
+namespace ControlStreamServer {
+
+namespace {
+
+bool IsEverythingOnItsWay(int descriptor)
+{
+    int unsent = 0;
+    return ::ioctl(descriptor, SIOCOUTQNSD, &unsent) != 0 || unsent == 0;
+}
+
+/// @return false where the peer has ended the stream or the connection is broken
+bool ThrowAwayWhatCame(int descriptor)
+{
+    std::array<char, 16 * 1024> ignored;
+    const ssize_t count = ::recv(descriptor, ignored.data(), ignored.size(), MSG_DONTWAIT);
+    return count > 0 || (count < 0 && (errno == EAGAIN || errno == EINTR));
+}
+
+} // namespace
+
+void AwaitLastBytes(int descriptor, std::chrono::milliseconds limit)
+{
+    // The system tells nobody when it has sent a byte, so it is asked again when some come, or
+    // soon.
+    constexpr int soon = 2; // milliseconds
+    const auto deadline = std::chrono::steady_clock::now() + limit;
+    while (!IsEverythingOnItsWay(descriptor) && std::chrono::steady_clock::now() < deadline) {
+        pollfd poller{descriptor, POLLIN, 0};
+        static_cast<void>(::poll(&poller, 1, soon));
+        if (!ThrowAwayWhatCame(descriptor)) {
+            return;
+        }
+    }
+}
+
+} // namespace ControlStreamServer

@@ -1,0 +1,18 @@
+#pragma once
+
+#include <chrono>
+
+namespace ControlStreamServer {
+
+/// How long a close waits, at most, for a device to make room for what it is still owed.
+constexpr std::chrono::milliseconds lastBytesLimit{1000};
+
+/// Waits until everything that was written to a TCP socket has left for the peer; meanwhile it
+/// throws away what comes in.
+///
+/// A system that closes a socket with unread bytes resets the connection and forgets what it had
+/// still to send, so that a device which is sending would not hear the last event.
+/// Returns early where the peer has gone. [any]
+void AwaitLastBytes(int descriptor, std::chrono::milliseconds limit);
+
+} // namespace ControlStreamServer
