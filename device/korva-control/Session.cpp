@@ -28,7 +28,7 @@ ControlStream::VClient& VSession::Connect()
 
 const std::string& VSession::HostAddress()
 {
-    if (hostAddress.empty()) {
+    if (hostAddress.empty() && !options.Host.empty()) { // an empty name is refused by the client
         hostAddress = ControlStream::FindHost(options.Host, TimeLimit());
     }
     return hostAddress;
