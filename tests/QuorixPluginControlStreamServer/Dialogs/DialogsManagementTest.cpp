@@ -163,13 +163,14 @@ TEST_F(ManagementDialog, ShowsTheButtonOfTheRowUnderTheMouse)
 
     QTest::mouseMove(&TestSupport::ViewOf(opened),
                      TestSupport::PlaceOf(RowOf(opened, "Alto")).center().toPoint());
-    EXPECT_TRUE(QTest::qWaitFor([&] { return alto.opacity() == 1.0; }));
+    EXPECT_TRUE(TestSupport::WaitFor([&] { return alto.opacity() == 1.0; }));
     EXPECT_EQ(0.0, bass.opacity());
 
     QTest::mouseMove(&TestSupport::ViewOf(opened), TestSupport::PlaceOf(alto).center().toPoint());
     QTest::mouseMove(&TestSupport::ViewOf(opened),
                      TestSupport::PlaceOf(RowOf(opened, "Bass")).center().toPoint());
-    EXPECT_TRUE(QTest::qWaitFor([&] { return alto.opacity() == 0.0 && bass.opacity() == 1.0; }));
+    EXPECT_TRUE(
+        TestSupport::WaitFor([&] { return alto.opacity() == 0.0 && bass.opacity() == 1.0; }));
 }
 
 TEST_F(ManagementDialog, KeepsTheButtonUpUnderTheMouse)
@@ -179,7 +180,7 @@ TEST_F(ManagementDialog, KeepsTheButtonUpUnderTheMouse)
 
     QTest::mouseMove(&TestSupport::ViewOf(opened), TestSupport::PlaceOf(alto).center().toPoint());
 
-    EXPECT_TRUE(QTest::qWaitFor([&] { return alto.opacity() == 1.0; }));
+    EXPECT_TRUE(TestSupport::WaitFor([&] { return alto.opacity() == 1.0; }));
 }
 
 TEST_F(ManagementDialog, ChangesNothingByForgetAndCancel)

@@ -10,6 +10,7 @@
 #include "notification/IPostalService.h"
 #include "notification/MakeShared.h"
 #include "qml/QmlModules.h"
+#include "support/WindowWait.h"
 
 #include <QApplication>
 #include <QDialog>
@@ -127,13 +128,13 @@ inline void Click(const QWidget& dialog, const QString& name)
 inline void Show(QDialog& dialog)
 {
     dialog.show();
-    if (!QTest::qWaitForWindowActive(&dialog)) {
+    if (!TestSupport::WaitForActive(dialog)) {
         throw std::runtime_error("the dialog does not come up");
     }
 }
 
 /// How long a dialog may wait for what a test does to it.
-constexpr std::chrono::seconds unansweredLimit{20};
+constexpr std::chrono::milliseconds unansweredLimit{windowLimit};
 
 /// Calls a function once a modal dialog runs its loop. What it throws fails the test, and so does a
 /// dialog that nobody answers; it is then taken down.
@@ -146,7 +147,7 @@ inline void OnceAsked(std::function<void(QDialog&)> operatorsDoing)
             ADD_FAILURE() << "nobody has answered";
             dialog->done(-1);
         });
-        EXPECT_TRUE(QTest::qWaitForWindowActive(dialog)); // before that it has no keyboard
+        EXPECT_TRUE(TestSupport::WaitForActive(*dialog)); // before that it has no keyboard
         try {
             doing(*dialog);
         } catch (const std::exception& exception) {

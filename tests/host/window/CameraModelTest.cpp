@@ -3,6 +3,7 @@
 #include "QuorixDataStore/DataWriter.h"
 #include "QuorixDataStoreTypes/GreyscaleMode.h"
 #include "host/cameras/CameraBench.h"
+#include "support/WindowWait.h"
 
 #include <QAbstractItemModelTester>
 #include <QFont>
@@ -52,7 +53,7 @@ protected:
 
     bool ComesToShow(int row, int column, const std::string& text)
     {
-        return QTest::qWaitFor([&] { return Text(row, column) == text; });
+        return TestSupport::WaitFor([&] { return Text(row, column) == text; });
     }
 
     const std::shared_ptr<VCameraSelection> selection = std::make_shared<VCameraSelection>();
@@ -101,7 +102,7 @@ TEST_F(CameraModel, ShowsAProposedValueUntilTheHardwareConfirmsIt)
 
     Confirm();
 
-    EXPECT_TRUE(QTest::qWaitFor([&] { return !IsPending(0, VCameraModel::ColumnStrobe); }));
+    EXPECT_TRUE(TestSupport::WaitFor([&] { return !IsPending(0, VCameraModel::ColumnStrobe); }));
     EXPECT_EQ("0.75", Text(0, VCameraModel::ColumnStrobe));
     EXPECT_FALSE(cell.data(Qt::FontRole).isValid());
 }
@@ -189,7 +190,7 @@ TEST_F(CameraModel, SelectsAndShowsTheSelection)
     const auto checked = [&](int row) {
         return Cell(row, VCameraModel::ColumnSelected).data(Qt::CheckStateRole) == Qt::Checked;
     };
-    EXPECT_TRUE(QTest::qWaitFor([&] { return checked(0) && !checked(2); }));
+    EXPECT_TRUE(TestSupport::WaitFor([&] { return checked(0) && !checked(2); }));
 }
 
 TEST_F(CameraModel, FollowsCamerasThatComeAndGo)
@@ -200,7 +201,8 @@ TEST_F(CameraModel, FollowsCamerasThatComeAndGo)
     cameras->RemoveCamera(2);
     cameras->AddCamera(7);
 
-    EXPECT_TRUE(QTest::qWaitFor([&] { return model->rowCount() == 4 && Text(3, 0) == "qx:7"; }));
+    EXPECT_TRUE(
+        TestSupport::WaitFor([&] { return model->rowCount() == 4 && Text(3, 0) == "qx:7"; }));
     EXPECT_EQ("qx:3", Text(1, 0));
     cameras->AddCamera(2);
     EXPECT_TRUE(ComesToShow(1, 0, "qx:2"));

@@ -1,5 +1,7 @@
 #include "window/GuiSignal.h"
 
+#include "support/WindowWait.h"
+
 #include <QCoreApplication>
 #include <QTest>
 #include <gtest/gtest.h>
@@ -21,7 +23,7 @@ TEST(GuiSignal, CallsOnTheEventLoopOnceForSeveralWishes)
     }).join();
     EXPECT_EQ(0, calls);
 
-    EXPECT_TRUE(QTest::qWaitFor([&] { return calls > 0; }));
+    EXPECT_TRUE(TestSupport::WaitFor([&] { return calls > 0; }));
     EXPECT_EQ(1, calls);
     EXPECT_EQ(std::this_thread::get_id(), caller);
 }

@@ -96,7 +96,7 @@ protected:
         });
         poll.start(0);
         EXPECT_EQ("Pending", Authorize(*host.GetControlSystem()));
-        EXPECT_TRUE(QTest::qWaitFor([&] { return answered; }));
+        EXPECT_TRUE(TestSupport::WaitFor([&] { return answered; }));
     }
 
     std::unique_ptr<VPlugin> plugin;
@@ -139,7 +139,7 @@ TEST_F(WindowPlugin, AddsItsItemToTheMenuAndItsPanel)
 TEST_F(WindowPlugin, ShowsTheDevicesThatAreKnownNow)
 {
     AskAndAnswer([](QDialog& question) { QuorixHost::PressItem(question, "buttonAllow"); });
-    ASSERT_TRUE(QTest::qWaitFor([] { return QuorixHost::FindQuestion() == nullptr; }));
+    ASSERT_TRUE(TestSupport::WaitFor([] { return QuorixHost::FindQuestion() == nullptr; }));
 
     MenuItem(Window(), "Settings", menuItem).trigger();
     ASSERT_NE(nullptr, FindReview());
@@ -154,7 +154,7 @@ TEST_F(WindowPlugin, ShowsTheDevicesThatAreKnownNow)
 TEST_F(WindowPlugin, KeepsWhatWasRememberedInThePreferences)
 {
     AskAndAnswer([](QDialog& question) { QuorixHost::PressItem(question, "buttonAllow"); });
-    ASSERT_TRUE(QTest::qWaitFor([] { return QuorixHost::FindQuestion() == nullptr; }));
+    ASSERT_TRUE(TestSupport::WaitFor([] { return QuorixHost::FindQuestion() == nullptr; }));
     EXPECT_EQ("", Stored("AllowedControls")); // only its end writes the lists
 
     Destroy();
@@ -219,7 +219,7 @@ TEST_F(WindowPlugin, AnswersTheRequestsThatWaitOneByOne)
         question.done(0);
     });
 
-    EXPECT_TRUE(QTest::qWaitFor([] { return QuorixHost::FindQuestion() == nullptr; }));
+    EXPECT_TRUE(TestSupport::WaitFor([] { return QuorixHost::FindQuestion() == nullptr; }));
     AskAndAnswer([](QDialog& question) { question.done(0); });
 }
 

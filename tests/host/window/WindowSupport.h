@@ -5,6 +5,7 @@
 #include "QuorixDataStore/DataStore.h"
 #include "QuorixDataStore/DataWriter.h"
 #include "io/Values.h"
+#include "support/WindowWait.h"
 #include "window/HostWindow.h"
 #include "window/MainWindow.h"
 #include "window/Palette.h"
@@ -47,7 +48,7 @@ protected:
     {
         QuorixHost::SetPalette(false);
         window->Show();
-        if (!QTest::qWaitForWindowActive(&Window())) {
+        if (!TestSupport::WaitForActive(Window())) {
             throw std::runtime_error("the window does not come up");
         }
     }

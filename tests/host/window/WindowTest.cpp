@@ -98,7 +98,7 @@ TEST_F(HostWindow, TakesWhatTheOperatorTypes)
     QTest::keyClick(&editor, Qt::Key_Return);
 
     EXPECT_TRUE(
-        QTest::qWaitFor([&] { return Text(table, 0, VCameraModel::ColumnStrobe) == "0.75"; }));
+        TestSupport::WaitFor([&] { return Text(table, 0, VCameraModel::ColumnStrobe) == "0.75"; }));
 }
 
 TEST_F(HostWindow, TellsTheOperatorWhatIsRefused)
@@ -109,7 +109,7 @@ TEST_F(HostWindow, TellsTheOperatorWhatIsRefused)
     QTest::keyClicks(&editor, "0.75");
     QTest::keyClick(&editor, Qt::Key_Return);
 
-    EXPECT_TRUE(QTest::qWaitFor([&] {
+    EXPECT_TRUE(TestSupport::WaitFor([&] {
         return Window().statusBar()->currentMessage() ==
                "Device.qx:4.Settings.Threshold refuses to be changed";
     }));
@@ -125,8 +125,8 @@ TEST_F(HostWindow, OffersTheGreyscaleModesByName)
     editor.setCurrentText("Edges");
     emit editor.activated(editor.currentIndex());
 
-    EXPECT_TRUE(
-        QTest::qWaitFor([&] { return Text(table, 0, VCameraModel::ColumnGreyscale) == "Edges"; }));
+    EXPECT_TRUE(TestSupport::WaitFor(
+        [&] { return Text(table, 0, VCameraModel::ColumnGreyscale) == "Edges"; }));
 }
 
 TEST_F(HostWindow, SelectsACameraByAClick)
@@ -139,7 +139,7 @@ TEST_F(HostWindow, SelectsACameraByAClick)
     QTest::mouseClick(table.viewport(), Qt::LeftButton, {},
                       place.topLeft() + QPoint(8, place.height() / 2));
 
-    EXPECT_TRUE(QTest::qWaitFor([&] { return cell.data(Qt::CheckStateRole) == Qt::Checked; }));
+    EXPECT_TRUE(TestSupport::WaitFor([&] { return cell.data(Qt::CheckStateRole) == Qt::Checked; }));
 }
 
 TEST_F(HostWindow, SwitchesTapToSelect)
@@ -155,16 +155,16 @@ TEST_F(HostWindow, SwitchesTapToSelect)
     }
 
     Write(path, MakeBoolValue(false)); // as a device does
-    EXPECT_TRUE(QTest::qWaitFor([&] { return !box.isChecked(); }));
+    EXPECT_TRUE(TestSupport::WaitFor([&] { return !box.isChecked(); }));
 }
 
 TEST_F(HostWindow, ShowsWhoIsConnectedSinceWhenAndHowFresh)
 {
     auto& table = Find<QTableView>("connections");
     Connect("id-1", "Tablet");
-    ASSERT_TRUE(QTest::qWaitFor([&] { return table.model()->rowCount() == 1; }));
-    ASSERT_TRUE(
-        QTest::qWaitFor([&] { return Text(table, 0, VConnectionModel::ColumnName) == "Tablet"; }));
+    ASSERT_TRUE(TestSupport::WaitFor([&] { return table.model()->rowCount() == 1; }));
+    ASSERT_TRUE(TestSupport::WaitFor(
+        [&] { return Text(table, 0, VConnectionModel::ColumnName) == "Tablet"; }));
     const std::string since = Text(table, 0, VConnectionModel::ColumnSince);
 
     EXPECT_EQ("id-1", Text(table, 0, VConnectionModel::ColumnId));
@@ -185,7 +185,7 @@ TEST_F(HostWindow, ShowsADeviceThatHasGone)
     Connect("id-1", "Tablet");
     Connect("id-1", "Tablet", false);
 
-    EXPECT_TRUE(QTest::qWaitFor([&] {
+    EXPECT_TRUE(TestSupport::WaitFor([&] {
         return table.model()->rowCount() == 1 &&
                Text(table, 0, VConnectionModel::ColumnState) == "gone";
     }));
@@ -197,10 +197,10 @@ TEST_F(HostWindow, CountsBeatsForTheDeviceThatCameLast)
 {
     auto& table = Find<QTableView>("connections");
     Connect("id-1", "Tablet");
-    ASSERT_TRUE(QTest::qWaitFor([&] { return table.model()->rowCount() == 1; }));
+    ASSERT_TRUE(TestSupport::WaitFor([&] { return table.model()->rowCount() == 1; }));
     DebugServices::AdvanceClock(1000);
     Connect("id-0", "Phone");
-    ASSERT_TRUE(QTest::qWaitFor([&] { return table.model()->rowCount() == 2; }));
+    ASSERT_TRUE(TestSupport::WaitFor([&] { return table.model()->rowCount() == 2; }));
 
     Beat();
 
@@ -263,7 +263,7 @@ TEST_F(HostWindow, ShowsTheLogAsItIsWritten)
     const auto last = [&](int column) {
         return Text(table, table.model()->rowCount() - 1, column);
     };
-    EXPECT_TRUE(QTest::qWaitFor(
+    EXPECT_TRUE(TestSupport::WaitFor(
         [&] { return last(VLogModel::ColumnText) == "A line of two lines and more"; }));
     EXPECT_EQ("WindowTest", last(VLogModel::ColumnCategory));
     EXPECT_EQ("warnings", last(VLogModel::ColumnLevel));
@@ -295,7 +295,7 @@ TEST_F(HostWindow, KeepsTheYoungestLinesOfALongLog)
         QuorixHost::VWindowLog::Installed().Log(std::to_string(i), nullptr, 4, nullptr, 0);
     }
 
-    EXPECT_TRUE(QTest::qWaitFor([&] {
+    EXPECT_TRUE(TestSupport::WaitFor([&] {
         return Text(table, table.model()->rowCount() - 1, VLogModel::ColumnText) ==
                std::to_string(QuorixHost::VWindowLog::mostLines + 9);
     }));
