@@ -1,6 +1,8 @@
 #include "korva-control/Commands.h"
 #include "korva-control/Session.h"
 
+#include "ControlStreamClient/Lint.h"
+
 #include <iostream>
 #include <iterator>
 
@@ -19,17 +21,23 @@ public:
     {
         CLI::App* command =
             program.add_subcommand("raw", "Send standard input as one frame and print the reply");
-        command->footer(
-            "Nothing is checked. The reply is the first frame that is not an event; a host "
-            "answers nothing to what it does not understand, which ends with 4.");
+        command->footer("Nothing is checked without --lint. The reply is the first frame that is "
+                        "not an event; a host "
+                        "answers nothing to what it does not understand, which ends with 4.");
         command->add_flag("--no-reply", noReply,
                           "Wait only until the host has handled the frame, and print nothing");
+        command->add_flag("--lint", lint,
+                          "Refuse what a host would drop in silence and say why, and warn of what "
+                          "it would take otherwise than it looks");
         return command;
     }
 
     EExitCode Run(VSession& session) override
     {
         const std::string text{std::istreambuf_iterator<char>(std::cin), {}};
+        if (lint) {
+            Lint(text);
+        }
         VClient& client = session.Connect();
         if (noReply) {
             SendOnly(session, client, text);
@@ -46,6 +54,17 @@ public:
     }
 
 private:
+    static void Lint(const std::string& text)
+    {
+        const ControlStream::VLintReport report = ControlStream::LintRequest(text);
+        if (!report.Refusal.empty()) {
+            throw VError(EErrorKind::Usage, "a host would drop this in silence: " + report.Refusal);
+        }
+        for (const std::string& warning : report.Warnings) {
+            PrintNotice("warning: " + warning);
+        }
+    }
+
     /// To close at once could take the frame back: a close with something unread resets the
     /// connection.
     static void SendOnly(const VSession& session, VClient& client, const std::string& text)
@@ -58,6 +77,7 @@ private:
     }
 
     bool noReply = false;
+    bool lint = false;
 };
 
 } // namespace

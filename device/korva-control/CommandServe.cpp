@@ -80,7 +80,7 @@ private:
             command
                 .add_option("--authorize", decision,
                             "What becomes of a device that asks for authorization")
-                ->transform(CLI::CheckedTransformer(Decisions))
+                ->transform(CLI::CheckedTransformer(Decisions).description(""))
                 ->type_name("allow|deny|ask-allow|ask-deny|ask-nobody");
         command
             .add_option("--thinking", thinking, "How many seconds the operator takes, where asked")
