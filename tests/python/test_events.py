@@ -61,12 +61,20 @@ class Events(ClientCase):
         self.assertEqual(['korva_control: a handler of the event "Event.A" failed'], reports)
 
     async def test_a_handler_that_was_taken_away_hears_nothing(self) -> None:
+        def script(peer: Peer) -> None:
+            request = peer.read()
+            peer.event("Event.A")
+            peer.reply(request)
+            peer.wait_for_end()
+
         heard: List[str] = []
-        await self.start(lambda peer: (peer.event("Event.A"), peer.reply(peer.read())))
+        await self.start(script)
         remove = self.client.on("Event.A", lambda event: heard.append(event.name))
+        finished = asyncio.Event()
+        self.client.on("*", lambda event: finished.set())  # called behind those of the name
         remove()
         await self.client.execute("A")
-        await asyncio.sleep(0)
+        await asyncio.wait_for(finished.wait(), LIMIT)
         self.assertEqual([], heard)
 
     async def test_what_nobody_takes_is_dropped_from_the_oldest_and_counted(self) -> None:
