@@ -17,15 +17,21 @@ void ReadEntry(const std::string& entry, bool allowed, VControlDevices& devices)
     }
 }
 
+// A zero could not be printed: the file would go without the whole list.
+constexpr char unprintable = '\0';
+
 bool IsStorable(const std::string& deviceId)
 {
     return deviceId.find(nameSeparator) == std::string::npos &&
-           deviceId.find(entrySeparator) == std::string::npos;
+           deviceId.find(entrySeparator) == std::string::npos &&
+           deviceId.find(unprintable) == std::string::npos;
 }
 
 std::string InOneLine(std::string name)
 {
-    const auto isBreak = [](char character) { return character == '\n' || character == '\r'; };
+    const auto isBreak = [](char character) {
+        return character == '\n' || character == '\r' || character == unprintable;
+    };
     std::replace_if(name.begin(), name.end(), isBreak, ' ');
     return name;
 }

@@ -18,8 +18,9 @@ void Read(const std::string& text, bool allowed, VControlDevices& devices);
 
 /// Makes the text of the devices that are allowed, or of those that are not, in their order.
 ///
-/// No name and no id can make the text read back with a device that is not there: line breaks of a
-/// name become blanks, and a device whose id holds a semicolon or a line feed is left out.
+/// No name and no id can make the text read back with a device that is not there, or keep it out of
+/// a file: line breaks and zeros of a name become blanks, and a device whose id holds a semicolon,
+/// a line feed or a zero is left out.
 std::string Write(const VControlDevices& devices, bool allowed);
 
 } // namespace ControlLists

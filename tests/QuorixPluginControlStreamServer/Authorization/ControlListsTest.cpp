@@ -123,3 +123,12 @@ TEST(ControlLists, NoIdCanAddADevice)
     EXPECT_EQ(expected, WrittenAndRead(devices));
     EXPECT_EQ("good;G", ControlLists::Write(devices, true));
 }
+
+TEST(ControlLists, NoZeroReachesTheText)
+{
+    using namespace std::string_literals;
+    const VControlDevices devices = {
+        {"a", {true, "x\0y"s}}, {"b\0"s, {true, "B"}}, {"c", {true, "C"}}};
+
+    EXPECT_EQ("a;x y\nc;C", ControlLists::Write(devices, true)); // a file would do without it
+}

@@ -203,3 +203,13 @@ TEST_F(ControlOutcome, MarkupThatBreaksTheLineAddsNobodyToTheLists)
     const VControlDevices expected = {{"id", {true, "Foo victim;y"}}};
     EXPECT_EQ(expected, manager->GetDevices());
 }
+
+TEST_F(ControlOutcome, MarkupThatNamesAZeroKeepsNoListOutOfTheFile)
+{
+    MakeWithOperator(EAskOutcome::DeniedAndRemembered);
+    Ask("id", "Foo&#0;bar");
+
+    manager.reset();
+
+    EXPECT_EQ("id;Foo bar", view.Banned());
+}
