@@ -23,7 +23,8 @@ void Pin(pid_t thread, int core)
     cpu_set_t set;
     CPU_ZERO(&set);
     CPU_SET(static_cast<std::size_t>(core), &set);
-    if (sched_setaffinity(thread, sizeof set, &set) != 0) {
+    // A thread may end between being listed and being pinned, as the one that announces a host.
+    if (sched_setaffinity(thread, sizeof set, &set) != 0 && errno != ESRCH) {
         throw std::system_error(errno, std::generic_category(), "sched_setaffinity");
     }
 }
