@@ -11,7 +11,8 @@ function(quorix_add_fuzz name)
     if(QUORIX_FUZZ)
         target_link_options(fuzz_${name} PRIVATE -fsanitize=fuzzer)
         # One line for each target, which ./check --soak reads: its name and its libFuzzer options.
-        file(APPEND ${PROJECT_BINARY_DIR}/fuzz-targets.txt "fuzz_${name} ${name} ${arg_OPTIONS}\n")
+        list(JOIN arg_OPTIONS " " options)
+        file(APPEND ${PROJECT_BINARY_DIR}/fuzz-targets.txt "fuzz_${name} ${name} ${options}\n")
     else()
         target_sources(fuzz_${name} PRIVATE ${PROJECT_SOURCE_DIR}/fuzz/ReplayMain.cpp)
         add_test(NAME fuzz_${name}_corpus
