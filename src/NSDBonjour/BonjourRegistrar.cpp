@@ -82,6 +82,9 @@ void VBonjourRegistrar::BonjourSocketReadyRead()
 {
     const DNSServiceErrorType result = calls.ProcessResult(context->Service);
     if (result != kDNSServiceErr_NoError) {
+        // A socket whose daemon is gone stays readable: until this thread ends, which may be never
+        // in a host without an event loop, it would be told of without end.
+        notifier->setEnabled(false);
         ReportError(result);
     }
 }

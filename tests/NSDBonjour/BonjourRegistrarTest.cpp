@@ -208,6 +208,20 @@ TEST_F(BonjourRegistrar, AFailureToReadTheAnswerIsTold)
     EXPECT_THAT(Errors(), ElementsAre("Service Not Running - Background daemon not running"));
 }
 
+TEST_F(BonjourRegistrar, ASocketThatFailsIsReadNoMore)
+{
+    library.ProcessAnswer = -65563;
+    emit registrar->Register("Name");
+    Serve();
+
+    Serve(); // as a socket whose other end is gone stays readable
+
+    EXPECT_EQ(1, library.Processed);
+    EXPECT_EQ(1U, Errors().size());
+    emit registrar->Register("Name");
+    EXPECT_EQ("Already registered a service", Errors().back());
+}
+
 TEST_F(BonjourRegistrar, AnUnknownErrorCodeIsToldAsUnrecognised)
 {
     library.ProcessAnswer = -12345;

@@ -40,8 +40,8 @@ public:
 
     static const VDnsServiceCalls& Calls();
 
-    /// Makes the socket readable, so that the registrar asks for one result; the next to be asked
-    /// calls back if `CallsBack`.
+    /// Makes the socket readable, so that the registrar asks for one result; after as many as
+    /// `ResultsBeforeCallBack` the next one calls back.
     void MakeReadable();
 
     /// Calls the registrar back as the library does from inside DNSServiceProcessResult.
