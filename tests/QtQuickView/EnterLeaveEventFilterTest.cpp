@@ -8,6 +8,8 @@
 #include <QCoreApplication>
 #include <QEnterEvent>
 #include <QQuickWidget>
+#include <QTest>
+#include <QWindow>
 
 #include <functional>
 
@@ -29,6 +31,7 @@ public:
             const auto* hover = static_cast<QHoverEvent*>(event);
             position = hover->posF();
             oldPosition = hover->oldPosF();
+            modifiers = hover->modifiers();
             if (action) {
                 action(object);
             }
@@ -39,6 +42,7 @@ public:
     std::vector<std::string> names;
     QPointF position;
     QPointF oldPosition;
+    Qt::KeyboardModifiers modifiers;
     std::function<void(QObject*)> action;
 };
 
@@ -121,6 +125,23 @@ TEST(EnterLeaveEventFilter, GivesThePositionInTheItemAsNewAndOld)
 
     EXPECT_EQ(QPointF(7, 8), hover.recorder.position);
     EXPECT_EQ(QPointF(7, 8), hover.recorder.oldPosition);
+}
+
+TEST(EnterLeaveEventFilter, TellsOfTheKeysThatAreHeldDown)
+{
+    VHoverView hover("Item { objectName: 'a'; width: 50; height: 50;" + hovering + "}");
+    QWindow window;
+    window.show();
+
+    QTest::keyPress(&window, Qt::Key_Control, Qt::ControlModifier);
+    hover.Enter(5, 5);
+    EXPECT_EQ(Qt::ControlModifier, hover.recorder.modifiers);
+    hover.Leave();
+    EXPECT_EQ(Qt::ControlModifier, hover.recorder.modifiers);
+
+    QTest::keyRelease(&window, Qt::Key_Control, Qt::NoModifier);
+    hover.Enter(5, 5);
+    EXPECT_EQ(Qt::NoModifier, hover.recorder.modifiers);
 }
 
 TEST(EnterLeaveEventFilter, LeavesAnItemAloneThatThePointerIsNotOver)
