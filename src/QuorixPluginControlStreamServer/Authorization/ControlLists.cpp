@@ -20,11 +20,15 @@ void ReadEntry(const std::string& entry, bool allowed, VControlDevices& devices)
 // A zero could not be printed: the file would go without the whole list.
 constexpr char unprintable = '\0';
 
-bool IsStorable(const std::string& deviceId)
+// A file beyond some megabytes is not read again, and everything else in it would go with the list.
+constexpr std::size_t longestEntry = std::size_t{64} << 10;
+
+bool IsStorable(const std::string& deviceId, const std::string& name)
 {
     return deviceId.find(nameSeparator) == std::string::npos &&
            deviceId.find(entrySeparator) == std::string::npos &&
-           deviceId.find(unprintable) == std::string::npos;
+           deviceId.find(unprintable) == std::string::npos &&
+           deviceId.size() + name.size() < longestEntry;
 }
 
 std::string InOneLine(std::string name)
@@ -53,7 +57,7 @@ std::string Write(const VControlDevices& devices, bool allowed)
     std::string text;
     bool first = true;
     for (const auto& [deviceId, record] : devices) {
-        if (record.Allowed != allowed || !IsStorable(deviceId)) {
+        if (record.Allowed != allowed || !IsStorable(deviceId, record.Name)) {
             continue;
         }
         if (!first) {

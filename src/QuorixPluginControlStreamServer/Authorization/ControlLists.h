@@ -20,7 +20,7 @@ void Read(const std::string& text, bool allowed, VControlDevices& devices);
 ///
 /// No name and no id can make the text read back with a device that is not there, or keep it out of
 /// a file: line breaks and zeros of a name become blanks, and a device whose id holds a semicolon,
-/// a line feed or a zero is left out.
+/// a line feed or a zero, or whose id and name together take 64 KiB or more, is left out.
 std::string Write(const VControlDevices& devices, bool allowed);
 
 } // namespace ControlLists

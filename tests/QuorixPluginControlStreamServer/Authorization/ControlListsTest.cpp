@@ -132,3 +132,14 @@ TEST(ControlLists, NoZeroReachesTheText)
 
     EXPECT_EQ("a;x y\nc;C", ControlLists::Write(devices, true)); // a file would do without it
 }
+
+TEST(ControlLists, NoDeviceFillsTheFile)
+{
+    const std::string longest(65534, 'x'); // by one more it would be left out
+    const VControlDevices devices = {{"a", {false, longest}},
+                                     {"b", {false, longest + "x"}},
+                                     {"c", {false, "C"}},
+                                     {longest + "xx", {false, ""}}};
+
+    EXPECT_EQ("a;" + longest + "\nc;C", ControlLists::Write(devices, false));
+}
