@@ -401,3 +401,21 @@ TEST_F(Plugin, AnExceptionOutOfTheSocketLeavesStart)
     EXPECT_TRUE(plugin->Start(host));
     EXPECT_TRUE(CanConnect());
 }
+
+TEST_F(Plugin, WithoutTheComputersNameAnExceptionLeavesStartWhichListensByThen)
+{
+    std::string failure;
+    std::thread([&] {
+        TestSupport::RefuseCall(SYS_uname);
+        try {
+            plugin->Start(host);
+        } catch (const boost::system::system_error& error) {
+            failure = error.what();
+        }
+    }).join();
+
+    EXPECT_EQ("Too many open files", failure);
+    VRawClient device(port);
+    EXPECT_EQ(serverInformation, device.Request("<ServerInformation/>"));
+    EXPECT_EQ(2U, controlSystem->CommandProviders().size());
+}

@@ -3,6 +3,7 @@
 
 #include <gmock/gmock.h>
 
+#include <chrono>
 #include <future>
 
 // The record of the connected device, which the check keeps honest.
@@ -74,6 +75,48 @@ TEST_F(HeartbeatCheck, CountsFromTheConnectionNotFromTheRequest)
     clock.Advance(3499);
     timers.Fire();
     EXPECT_TRUE(view.IsConnected("id"));
+}
+
+TEST_F(HeartbeatCheck, CountsFromTheEndOfTheRecordsWriting)
+{
+    view.Listeners(VDataPath("Control.id.Connected")).OnVerifiedChanged.Add([this] {
+        clock.Advance(1000); // as a listener does that takes its time
+    });
+    Ask("id");
+
+    clock.Advance(3499);
+    timers.Fire();
+
+    EXPECT_TRUE(view.IsConnected("id"));
+}
+
+TEST_F(HeartbeatCheck, FollowsARecordThatIsWrittenAtOnce)
+{
+    std::string nameWhenConnected;
+    view.Listeners(VDataPath("Control.id.Connected")).OnVerifiedChanged.Add([&] {
+        nameWhenConnected = view.NameOf("id");
+    });
+
+    Ask("id", "Name");
+
+    EXPECT_EQ("Name", nameWhenConnected);
+}
+
+TEST_F(HeartbeatCheck, HoldsTheLockWhileItWrites)
+{
+    Ask("id");
+    std::future<std::string> current;
+    view.Listeners(VDataPath("Control.id.Connected")).OnVerifiedChanged.Add([&] {
+        current = std::async(std::launch::async, [this] { return manager->GetCurrentDeviceId(); });
+        // Without the lock it would be there at once.
+        EXPECT_EQ(std::future_status::timeout, current.wait_for(std::chrono::milliseconds(50)));
+    });
+    clock.Advance(3500);
+
+    EXPECT_TRUE(timers.Fire());
+
+    ASSERT_TRUE(current.valid());
+    EXPECT_EQ("id", current.get());
 }
 
 TEST_F(HeartbeatCheck, ATimeThatWasSetBackCountsAsFresh)
