@@ -145,8 +145,10 @@ EWaited VConnection::Turn(VSendQueue& queue, const VDeadline& deadline, bool int
         return EWaited::TimedOut;
     }
     // A socket that has failed says so by reading.
-    if ((descriptors[0].revents & ~POLLOUT) != 0) {
-        ReadSome();
+    if ((descriptors[0].revents & ~POLLOUT) != 0 && ReadSome()) {
+        // A host holds back its next replies until the last are acknowledged, which the kernel
+        // would put off for 40 ms while nothing is to be sent.
+        SetQuickAcknowledgement();
     }
     if (descriptors[1].revents != 0) {
         TakeInterrupt();
@@ -405,9 +407,14 @@ bool VConnection::ReadSome()
 void VConnection::AcknowledgeAtOnce()
 {
     if (quickAcknowledgement) {
-        const int on = 1; // the kernel takes it back by itself, so it is set anew each time
-        setsockopt(socket, IPPROTO_TCP, TCP_QUICKACK, &on, sizeof on);
+        SetQuickAcknowledgement();
     }
+}
+
+void VConnection::SetQuickAcknowledgement()
+{
+    const int on = 1; // the kernel takes it back by itself, so it is set anew each time
+    setsockopt(socket, IPPROTO_TCP, TCP_QUICKACK, &on, sizeof on);
 }
 
 void VConnection::FailClosed(const std::string& reason)

@@ -95,6 +95,7 @@ private:
     void TakeInterrupt();
     bool ReadSome();
     void AcknowledgeAtOnce();
+    void SetQuickAcknowledgement();
     [[noreturn]] void FailClosed(const std::string& reason);
 
     const bool quickAcknowledgement;
