@@ -5,13 +5,17 @@ add_library(quorix_options INTERFACE)
 add_library(Quorix::options ALIAS quorix_options)
 
 target_compile_features(quorix_options INTERFACE cxx_std_17)
-target_include_directories(quorix_options INTERFACE ${PROJECT_SOURCE_DIR}/src)
+target_include_directories(quorix_options INTERFACE
+    $<BUILD_INTERFACE:${PROJECT_SOURCE_DIR}/src>
+    $<INSTALL_INTERFACE:include/quorix>
+)
+# Warnings are ours; whoever builds with the installed headers has their own.
 target_compile_options(quorix_options INTERFACE
-    -Wall -Wextra -Wpedantic -Wnon-virtual-dtor -Woverloaded-virtual
-    $<$<CXX_COMPILER_ID:Clang>:-Wshadow;-Wthread-safety>
+    "$<BUILD_INTERFACE:-Wall;-Wextra;-Wpedantic;-Wnon-virtual-dtor;-Woverloaded-virtual>"
+    "$<BUILD_INTERFACE:$<$<CXX_COMPILER_ID:Clang>:-Wshadow;-Wthread-safety>>"
     # Clang lets a constructor's argument bear the name of the field that it sets; so does this.
-    $<$<CXX_COMPILER_ID:GNU>:-Wshadow=local>
-    $<$<BOOL:${QUORIX_WERROR}>:-Werror>
+    "$<BUILD_INTERFACE:$<$<CXX_COMPILER_ID:GNU>:-Wshadow=local>>"
+    "$<BUILD_INTERFACE:$<$<BOOL:${QUORIX_WERROR}>:-Werror>>"
 )
 
 if(QUORIX_SANITIZE)
