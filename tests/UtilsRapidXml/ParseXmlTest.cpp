@@ -144,6 +144,16 @@ const VRefusedCase acceptanceCases[] = {
 INSTANTIATE_TEST_SUITE_P(Texts, ParseXmlAcceptance, testing::ValuesIn(acceptanceCases),
                          [](const auto& parameters) { return parameters.param.name; });
 
+TEST(ParseXml, PassesAByteOrderMark)
+{
+    std::string text = "\xEF\xBB\xBF<?xml version=\"1.0\"?><a/>";
+    rapidxml::xml_document<char> document;
+
+    ASSERT_TRUE(ParseXml<0>(document, text.data()));
+
+    EXPECT_STREQ("a", document.first_node()->name());
+}
+
 TEST(ParseXml, LeavesAnEmptyDocumentAfterAFault)
 {
     std::wstring text = L"<a/><b/><c";

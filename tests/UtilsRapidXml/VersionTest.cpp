@@ -2,6 +2,8 @@
 
 #include <gtest/gtest.h>
 
+#include <sstream>
+
 using namespace UtilsRapidXml;
 
 namespace {
@@ -61,6 +63,15 @@ TEST(Version, AnUnsetOneHasNoText)
     EXPECT_EQ(VersionText(unset), "");
     EXPECT_EQ(VersionText({-1, 3}), "");
     EXPECT_EQ(VersionText({3, -1}), "");
+}
+
+TEST(Version, AnUnsetOnePrintsNothing)
+{
+    std::ostringstream text;
+
+    text << v2 << '|' << unset << '|' << IVersion{3, -1};
+
+    EXPECT_EQ(text.str(), "2.0||");
 }
 
 TEST(Version, EachLimitCountsOnItsOwn)
