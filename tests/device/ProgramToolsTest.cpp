@@ -320,6 +320,20 @@ TEST(ProgramReplay, TimesOutWhereAReplyIsMissing)
     EXPECT_THAT(outcome.Errors, HasSubstr("waiting for the reply that was recorded as <Old/>"));
 }
 
+TEST(ProgramRaw, RefusesWithItsReasonWhatAHostWouldDrop)
+{
+    VServedHost host;
+
+    const VOutcome refused = RunProgram(At(host.Port(), {"raw", "--lint"}), "<Commands/>");
+    EXPECT_EQ(2, refused.ExitCode);
+    EXPECT_EQ("korva-control: a host would drop this in silence: Commands has no Correlation\n",
+              refused.Errors);
+    const VOutcome taken = RunProgram(At(host.Port(), {"raw", "--lint"}), "<Events a='1'/>");
+    EXPECT_EQ(0, taken.ExitCode);
+    EXPECT_EQ("korva-control: warning: attributes are not looked at\n", taken.Errors);
+    EXPECT_THAT(taken.Output, HasSubstr("<Events>"));
+}
+
 TEST(ProgramBench, PrintsPercentilesOfAClosedLoop)
 {
     VServedHost host;

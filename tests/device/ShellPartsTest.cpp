@@ -1,0 +1,130 @@
+#include "korva-control/ShellNames.h"
+#include "korva-control/ShellWords.h"
+
+#include "ControlStreamClient/Error.h"
+
+#include <gmock/gmock.h>
+
+namespace {
+
+using ControlStream::VParameterInformation;
+using testing::ElementsAre;
+using testing::IsEmpty;
+
+using Words = std::vector<std::string>;
+
+struct VWordsCase
+{
+    const char* Name;
+    std::string Line;
+    Words Expected;
+};
+
+class ShellWords : public testing::TestWithParam<VWordsCase>
+{
+};
+
+TEST_P(ShellWords, AreCutAtBlanks)
+{
+    EXPECT_EQ(GetParam().Expected, SplitWords(GetParam().Line));
+}
+
+// clang-format off
+const VWordsCase wordsCases[] = {
+    {"Nothing", "", {}},
+    {"Blanks", " \t ", {}},
+    {"Plain", " run  Go a=1 ", {"run", "Go", "a=1"}},
+    {"Quoted", R"(a="b c"d)", {"a=b cd"}},
+    {"EmptyQuotes", R"(a "")", {"a", ""}},
+    {"Escaped", R"(a\ b \"c \\)", {"a b", "\"c", "\\"}},
+    {"EscapedInQuotes", R"("a\"b")", {"a\"b"}},
+    {"BackslashAtTheEnd", "a\\", {"a\\"}},
+    {"NotAscii", "\xD0\xBC \xE4\xB8\x80", {"\xD0\xBC", "\xE4\xB8\x80"}},
+};
+// clang-format on
+
+INSTANTIATE_TEST_SUITE_P(Table, ShellWords, testing::ValuesIn(wordsCases),
+                         [](const auto& named) { return std::string(named.param.Name); });
+
+TEST(ShellWord, IsQuotedSoThatItIsReadAsItWas)
+{
+    for (const std::string word : {"plain", "a b", "\"", "\\", "a\tb"}) {
+        EXPECT_THAT(SplitWords("x " + QuotedWord(word)), ElementsAre("x", word));
+    }
+}
+
+TEST(ShellWord, NeedsItsClosingQuote)
+{
+    EXPECT_THROW(SplitWords("a \"b"), ControlStream::VError);
+}
+
+/// The words of candidates, with "+" behind those that a blank may follow.
+Words Shown(const std::vector<VCandidate>& candidates)
+{
+    Words shown;
+    for (const VCandidate& candidate : candidates) {
+        shown.push_back(candidate.Word + (candidate.IsWhole ? "+" : ""));
+    }
+    return shown;
+}
+
+class ShellNames : public testing::Test
+{
+protected:
+    ShellNames()
+    {
+        names.SetCommands({"Camera_Get", "Camera_Set", "Host.Echo"});
+        names.SetEvents({"Event.A", "Event.B"});
+    }
+
+    std::vector<std::string> described;
+    VShellNames names{[this](const std::string& command) {
+        described.push_back(command);
+        return command == "Host.Echo"
+                   ? std::vector<VParameterInformation>{{"*", ""}}
+                   : std::vector<VParameterInformation>{{"Id", ""}, {"Index", ""}, {"Value", ""}};
+    }};
+};
+
+TEST_F(ShellNames, CompleteTheFirstWordToItsOwnAndTheHostsCommands)
+{
+    EXPECT_THAT(Shown(names.Complete({"Camera_"})), ElementsAre("Camera_Get+", "Camera_Set+"));
+    EXPECT_THAT(Shown(names.Complete({"desc"})), ElementsAre("describe+", "describe-event+"));
+    EXPECT_THAT(Shown(names.Complete({"nothing"})), IsEmpty());
+    EXPECT_THAT(names.Complete({""}).size(), ShellWordList().size() + 3);
+    EXPECT_THAT(names.Complete({}), IsEmpty());
+}
+
+TEST_F(ShellNames, CompleteEventsWhereEventsBelong)
+{
+    EXPECT_THAT(Shown(names.Complete({"describe-event", ""})), ElementsAre("Event.A+", "Event.B+"));
+    EXPECT_THAT(Shown(names.Complete({"watch", "Event.A", "Event.B"})), ElementsAre("Event.B+"));
+}
+
+TEST_F(ShellNames, CompleteParametersByTheHostsDescription)
+{
+    EXPECT_THAT(Shown(names.Complete({"run", "Camera_Set", "I"})), ElementsAre("Id=", "Index="));
+    EXPECT_THAT(Shown(names.Complete({"Camera_Set", "Id=1", ""})), ElementsAre("Index=", "Value="));
+    EXPECT_THAT(Shown(names.Complete({"Camera_Set", "Id=1", "Id"})), IsEmpty());
+    EXPECT_THAT(described, ElementsAre("Camera_Set")) << "the host is asked once";
+    EXPECT_THAT(names.Complete({"Host.Echo", ""}), IsEmpty()) << "any name is no name";
+    EXPECT_THAT(names.Complete({"Unknown", ""}), IsEmpty());
+    EXPECT_THAT(names.Complete({"describe", "Camera_Get", ""}), IsEmpty());
+}
+
+TEST_F(ShellNames, ForgetWhatAnotherHostMayNotHave)
+{
+    names.Forget();
+
+    EXPECT_FALSE(names.IsCommand("Camera_Get"));
+    EXPECT_THAT(names.Complete({"watch", ""}), IsEmpty());
+}
+
+TEST(ShellNamesStart, IsWhatAllHaveInCommon)
+{
+    EXPECT_EQ("", VShellNames::CommonStart({}));
+    EXPECT_EQ("ab", VShellNames::CommonStart({{"abc", true}, {"abd", true}, {"ab", true}}));
+    EXPECT_EQ("", VShellNames::CommonStart({{"a", true}, {"b", true}}));
+}
+
+} // namespace
