@@ -152,9 +152,12 @@ void SaveFile(IDataStore& store, const VDataPath& content, const std::string& fo
         const VDataVerifyReader reader(scratch);
         static_cast<void>(DataStoreFileIO::WriteConfiguration(reader, document)); // likewise
     }
+    const std::string text = PrintDocument(document);
+    if (text.size() > GreatestPreferenceFile) {
+        return; // it would not be read again, and the old file is worth more than none
+    }
     // A file that cannot be written stays as it was; nobody is told.
-    static_cast<void>(UtilsFileSystem::ReplaceFile(boost::filesystem::path(folder) / name,
-                                                   PrintDocument(document)));
+    static_cast<void>(UtilsFileSystem::ReplaceFile(boost::filesystem::path(folder) / name, text));
 }
 
 } // namespace

@@ -27,6 +27,6 @@ void LoadPreferences(IDataStore& store, IHostPaths& hostPaths);
 
 /// Writes both files, each with its own sub-tree of the store without the read-only items.
 ///
-/// A file is replaced as a whole or left as it was. Nothing is logged about a file that cannot be
-/// written. Threads: the caller's.
+/// A file is replaced as a whole or left as it was, also where it would be too great to be read
+/// again. Nothing is logged about a file that cannot be written. Threads: the caller's.
 void SavePreferences(IDataStore& store, IHostPaths& hostPaths);

@@ -70,6 +70,34 @@ TEST_F(SavePreferencesTest, AnEmptySubTreeGivesAFileAllTheSame)
     EXPECT_EQ(ContentOf(UserFile()), emptyFile);
 }
 
+TEST_F(SavePreferencesTest, ItemsAtAnyDepthAreSaved)
+{
+    SetCaptureFolder(store, "/captures");
+    Put("Preferences.System.A.B.C", MakeBoolValue(true));
+
+    Save();
+
+    EXPECT_THAT(ContentOf(SystemFile()), HasSubstr("\t\t\t<Node name=\"Directory\">\n"
+                                                   "\t\t\t\t<Item name=\"Default\" "));
+    EXPECT_THAT(ContentOf(SystemFile()), HasSubstr("\t\t\t\t<Node name=\"B\">\n"
+                                                   "\t\t\t\t\t<Item name=\"C\" "));
+}
+
+TEST_F(SavePreferencesTest, AFileThatWouldNotBeReadAgainLeavesTheOldOne)
+{
+    Put("Preferences.User.A", MakeStringValue("old"));
+    Save();
+    const std::string old = ContentOf(UserFile());
+
+    Put("Preferences.User.A", MakeStringValue(std::string(GreatestPreferenceFile, 'n')));
+    Put("Preferences.System.A", MakeBoolValue(true));
+    Save();
+
+    EXPECT_TRUE(ContentOf(UserFile()) == old); // too long to be shown
+    EXPECT_THAT(ContentOf(SystemFile()), HasSubstr("\"A\""));
+    EXPECT_THAT(Logged(), IsEmpty());
+}
+
 TEST_F(SavePreferencesTest, ReadOnlyItemsStayOut)
 {
     Put("Preferences.User.A", MakeBoolValue(true), EDataValueFlags::ReadOnly);
