@@ -25,6 +25,15 @@ public:
     {
     }
 
+    // Copies share no text: the standard's would, and copies go from thread to thread.
+    VError(const VError& other) : std::runtime_error(std::string(other.what())), kind(other.kind) {}
+    VError& operator=(const VError& other)
+    {
+        std::runtime_error::operator=(std::runtime_error(std::string(other.what())));
+        kind = other.kind;
+        return *this;
+    }
+
     EErrorKind Kind() const { return kind; }
 
 private:

@@ -205,6 +205,7 @@ TEST(AsyncClient, LeavesAHostThatStopsAnswering)
     VAsyncOptions options = OptionsFor(host, Hasty);
     VAsyncClient client(options);
 
+    ASSERT_TRUE(client.WaitUntilConnected(Patient)); // or the request would wait for that alone
     EXPECT_EQ((VThrown{EErrorKind::TimedOut,
                        "timed out after 0.03 s, waiting for the reply to the command \"Go\""}),
               ErrorOf(client.ExecuteCommand("Go")));
