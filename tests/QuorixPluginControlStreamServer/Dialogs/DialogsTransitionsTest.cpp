@@ -1,0 +1,105 @@
+#include "Dialogs/DialogsSupport.h"
+#include "QuorixPluginControlStreamServer/Authorization/QuorixControlManagementDialog.h"
+
+#include <QEasingCurve>
+#include <QQmlContext>
+#include <QQmlEngine>
+#include <QQmlExpression>
+
+#include <string>
+#include <vector>
+
+// How the rows of the list come, go and make room.
+
+using TestSupport::ItemOf;
+using TestSupport::PlaceOf;
+
+namespace {
+
+struct VAnimation
+{
+    std::string property;
+    double from;
+    double to;
+    int duration;
+    int easing; ///< a QEasingCurve::Type
+};
+
+bool operator==(const VAnimation& left, const VAnimation& right)
+{
+    return left.property == right.property && left.from == right.from && left.to == right.to &&
+           left.duration == right.duration && left.easing == right.easing;
+}
+
+std::ostream& operator<<(std::ostream& out, const VAnimation& animation)
+{
+    return out << animation.property << ' ' << animation.from << " to " << animation.to << ", "
+               << animation.duration << " ms, " << animation.easing;
+}
+
+class ManagementTransitions : public TestSupport::VDialogs
+{
+protected:
+    /// Returns what QML finds at a path below the list.
+    QVariant Find(const std::string& path) const
+    {
+        QQuickItem& list = ItemOf(dialog, "list");
+        return QQmlExpression(qmlContext(&list), &list, QString::fromStdString(path)).evaluate();
+    }
+
+    /// Returns the animations of one of the list's transitions.
+    std::vector<VAnimation> Of(const std::string& transition) const
+    {
+        qmlExecuteDeferred(Find(transition).value<QObject*>()); // else it waits for its first run
+        std::vector<VAnimation> found;
+        const int count = Find(transition + ".animations.length").toInt();
+        for (int i = 0; i < count; ++i) {
+            const std::string path = transition + ".animations[" + std::to_string(i) + "].";
+            found.push_back({Find(path + "property").toString().toStdString(),
+                             Find(path + "from").toDouble(), Find(path + "to").toDouble(),
+                             Find(path + "duration").toInt(), Find(path + "easing.type").toInt()});
+        }
+        return found;
+    }
+
+    const VQuorixControlManagementDialog dialog{context, authorization};
+};
+
+} // namespace
+
+TEST_F(ManagementTransitions, ARowThatComesFadesIn)
+{
+    const std::vector<VAnimation> expected = {{"opacity", 0.0, 1.0, 300, QEasingCurve::InQuart}};
+    EXPECT_EQ(expected, Of("add"));
+}
+
+TEST_F(ManagementTransitions, ARowThatGoesFadesOut)
+{
+    const std::vector<VAnimation> expected = {{"opacity", 1.0, 0.0, 300, QEasingCurve::OutQuart}};
+    EXPECT_EQ(expected, Of("remove"));
+}
+
+TEST_F(ManagementTransitions, RowsMoveUpAndAreWholeAgain)
+{
+    const std::vector<VAnimation> animations = Of("displaced");
+
+    ASSERT_EQ(2U, animations.size());
+    EXPECT_EQ("y", animations[0].property);
+    EXPECT_EQ(300, animations[0].duration);
+    EXPECT_EQ(QEasingCurve::InOutSine, animations[0].easing);
+    EXPECT_EQ("opacity", animations[1].property);
+    EXPECT_EQ(1.0, animations[1].to);
+}
+
+TEST_F(ManagementTransitions, RowsAreAMarginApart)
+{
+    VQuorixControlManagementDialog shown(context, authorization);
+    shown.setAttribute(Qt::WA_DeleteOnClose, false);
+    TestSupport::Show(shown);
+    const QRectF view = PlaceOf(ItemOf(shown, "backgroundRect"));
+
+    const qreal margin = view.right() - PlaceOf(ItemOf(shown, "buttonCancel")).right();
+
+    EXPECT_GT(margin, 0);
+    EXPECT_EQ(margin, ItemOf(shown, "list").property("spacing").toReal());
+}
