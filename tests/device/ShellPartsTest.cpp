@@ -5,6 +5,8 @@
 
 #include <gmock/gmock.h>
 
+#include <functional>
+
 namespace {
 
 using ControlStream::VParameterInformation;
@@ -77,13 +79,17 @@ protected:
         names.SetEvents({"Event.A", "Event.B"});
     }
 
-    std::vector<std::string> described;
-    VShellNames names{[this](const std::string& command) {
+    std::vector<VParameterInformation> Describe(const std::string& command)
+    {
         described.push_back(command);
-        return command == "Host.Echo"
-                   ? std::vector<VParameterInformation>{{"*", ""}}
-                   : std::vector<VParameterInformation>{{"Id", ""}, {"Index", ""}, {"Value", ""}};
-    }};
+        if (command == "Host.Echo") {
+            return {{"*", ""}};
+        }
+        return {{"Id", ""}, {"Index", ""}, {"Value", ""}};
+    }
+
+    std::vector<std::string> described;
+    VShellNames names{std::bind(&ShellNames::Describe, this, std::placeholders::_1)};
 };
 
 TEST_F(ShellNames, CompleteTheFirstWordToItsOwnAndTheHostsCommands)
