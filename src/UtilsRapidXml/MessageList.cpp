@@ -9,7 +9,7 @@ void VMessageList::Add(const std::string& text)
         return;
     }
     texts.push_back(text);
-    size += text.size() + sizeof text;
+    size += text.size() + sizeof(std::string);
 }
 
 void VMessageList::AppendTo(std::vector<std::string>& messages) const

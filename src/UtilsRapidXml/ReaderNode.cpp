@@ -279,13 +279,14 @@ bool VReaderNode::HasRoomForErrors() const
 template <typename... Args>
 void VReaderNode::Error(const char* format, const Args&... args)
 {
-    AddError(HasRoomForErrors() ? KVR::FormatMessage(format, args...) : std::string());
+    VReaderNode::AddError(HasRoomForErrors() ? KVR::FormatMessage(format, args...) : std::string());
 }
 
 template <typename... Args>
 void VReaderNode::Warn(const char* format, const Args&... args)
 {
-    AddWarning(global->Warnings.HasRoom() ? KVR::FormatMessage(format, args...) : std::string());
+    VReaderNode::AddWarning(global->Warnings.HasRoom() ? KVR::FormatMessage(format, args...)
+                                                       : std::string());
 }
 
 std::string VReaderNode::PathOf(std::string_view child) const

@@ -26,6 +26,7 @@ bool ConvertNumber(const unsigned char* bytes, void* destination)
 {
     Stored stored;
     std::memcpy(&stored, bytes, sizeof(stored));
+    // NOLINTNEXTLINE(bugprone-signed-char-misuse): a number of eight bits is no character
     const auto current = static_cast<Current>(stored);
     std::memcpy(destination, &current, sizeof(current));
     return true;
@@ -47,6 +48,7 @@ bool ConvertEnum(const unsigned char* bytes, void* destination)
     using Limits = std::numeric_limits<Current>;
     constexpr std::int64_t greatest =
         std::numeric_limits<typename std::make_unsigned<Current>::type>::max();
+    // NOLINTNEXTLINE(bugprone-signed-char-misuse): a number of eight bits is no character
     const std::int64_t number = stored;
     return number >= Limits::min() && number <= greatest &&
            ConvertNumber<Stored, Current>(bytes, destination);

@@ -59,8 +59,10 @@ private:
         EnumMapping mapping;
         std::vector<std::string> lines;
         if (!BuildEnumMapping(stored, current, mapping, lines)) {
+            const std::string place = path + ": ";
             for (const std::string& line : lines) {
-                errors.push_back(path + ": " + line);
+                errors.push_back(place);
+                errors.back() += line;
             }
         } else if (stored.EnumValues != current.EnumValues) {
             warnings.push_back(path + ": Enum was modified");
