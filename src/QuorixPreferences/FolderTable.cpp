@@ -9,20 +9,20 @@ namespace {
 struct VRow
 {
     int Feature;
+    int DefaultFolder;
     const char* DisplayName;
     const char* Key;
-    int DefaultFolder;
 };
 
 // Deliberate: the two folders of props have one display name, by which users know both.
 constexpr VRow rows[] = {
-    {1, "Subjects", "FolderSubjects", HostFolder::Subjects},
-    {1, "Model Templates", "FolderSubjectCalTemplates", HostFolder::SubjectCalTemplates},
-    {1, "Skins", "FolderSkins", HostFolder::Skins},
-    {2, "Props", "FolderProps", HostFolder::Props},
-    {2, "Props", "FolderPropMeshes", HostFolder::PropMeshes},
-    {3, "Labeling Clusters", "FolderClusters", HostFolder::Clusters},
-    {4, "Objects", "FolderObjects", HostFolder::Objects},
+    {1, HostFolder::Subjects, "Subjects", "FolderSubjects"},
+    {1, HostFolder::SubjectCalTemplates, "Model Templates", "FolderSubjectCalTemplates"},
+    {1, HostFolder::Skins, "Skins", "FolderSkins"},
+    {2, HostFolder::Props, "Props", "FolderProps"},
+    {2, HostFolder::PropMeshes, "Props", "FolderPropMeshes"},
+    {3, HostFolder::Clusters, "Labeling Clusters", "FolderClusters"},
+    {4, HostFolder::Objects, "Objects", "FolderObjects"},
 };
 
 } // namespace

@@ -2,6 +2,7 @@
 
 #include <array>
 #include <cerrno>
+#include <cstddef>
 
 #include <linux/sockios.h>
 #include <poll.h>
@@ -21,7 +22,7 @@ bool IsEverythingOnItsWay(int descriptor)
 /// @return false where the peer has ended the stream or the connection is broken
 bool ThrowAwayWhatCame(int descriptor)
 {
-    std::array<char, 16 * 1024> ignored;
+    std::array<char, std::size_t{16} * 1024> ignored;
     const ssize_t count = ::recv(descriptor, ignored.data(), ignored.size(), MSG_DONTWAIT);
     return count > 0 || (count < 0 && (errno == EAGAIN || errno == EINTR));
 }
