@@ -55,7 +55,7 @@ VHostFolders::VHostFolders(const std::string& folder)
 {
     MakeFolder(parent);
     for (const VNumberedFolder& numbered : numberedFolders) {
-        MakeFolder(GetFolder(numbered.number));
+        MakeFolder(VHostFolders::GetFolder(numbered.number));
     }
 }
 
