@@ -9,13 +9,20 @@ VFakeOperator::VFakeOperator(const VOperatorOptions& operatorOptions)
 
 VFakeOperator::~VFakeOperator()
 {
+    EndThinking();
+    disconnected();
+}
+
+void VFakeOperator::EndThinking()
+{
     {
         const std::lock_guard<std::mutex> lock(mutex);
         ending = true;
     }
     changed.notify_all();
-    thread.join();
-    disconnected();
+    if (thread.joinable()) {
+        thread.join();
+    }
 }
 
 EAuthorizeAnswer VFakeOperator::Authorize(const std::string& deviceId,

@@ -28,8 +28,9 @@ struct VOperatorOptions
 
 /// An authorization without lists, dialogs and memory: the same decision for every device.
 ///
-/// Owns: the thread on which the operator thinks. Threads: every operation [any]. Whoever holds it
-/// last must not be that thread.
+/// Owns: the thread on which the operator thinks. Threads: every operation [any]. An answer holds
+/// it for the length of its event, so whoever lets go of it ends the thinking before: it must not
+/// be destroyed by its own thread.
 class VFakeOperator : public IControlAuthorization
 {
 public:
@@ -37,6 +38,9 @@ public:
 
     /// Tells that the host goes away.
     ~VFakeOperator() override;
+
+    /// Ends the thread, after the answer that it may be giving. [whoever made it]
+    void EndThinking();
 
     EAuthorizeAnswer Authorize(const std::string& deviceId, const std::string& deviceName) override;
     void CancelAuthorize(const std::string& deviceId) override;

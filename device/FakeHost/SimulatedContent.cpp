@@ -53,6 +53,10 @@ public:
     /// The operator goes with the last provider that knows it, and tells of that.
     void SayFarewell() override
     {
+        if (asked) {
+            asked->EndThinking();
+            asked.reset();
+        }
         dispatcher->RemoveEventProvider(outcomes);
         outcomes.reset();
         dispatcher->RemoveCommandProvider(requests);
@@ -63,6 +67,7 @@ private:
     /// In the order in which the plug-in adds its own, behind the host's.
     void AddProviders(const std::shared_ptr<VFakeOperator>& fakeOperator)
     {
+        asked = fakeOperator;
         IControlSystem* const target = dispatcher.get();
         requests = std::make_shared<VCommandProviderAuthorization>(fakeOperator);
         outcomes = std::make_shared<VEventProviderAuthorized>(dispatcher, fakeOperator);
@@ -85,6 +90,7 @@ private:
         std::make_shared<QuorixHost::VCameraSelection>();
     const std::shared_ptr<QuorixHost::VControlSystem> dispatcher =
         std::make_shared<QuorixHost::VControlSystem>();
+    std::shared_ptr<VFakeOperator> asked;
     std::shared_ptr<VCommandProviderAuthorization> requests;
     std::shared_ptr<VEventProviderAuthorized> outcomes;
 };
