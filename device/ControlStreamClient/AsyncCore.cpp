@@ -43,7 +43,7 @@ VAsyncCore::VAsyncCore(const VAsyncOptions& asyncOptions)
                   [&call](const std::string& correlation) {
                       return MakeExecuteCommandRequest(correlation, call.Name, call.Parameters);
                   },
-                  [finish](VOutcome<VMessage> outcome) {
+                  [finish](const VOutcome<VMessage>& outcome) {
                       const VError* const error = outcome.Error();
                       finish(error != nullptr ? VOutcome<VCommandReply>(*error)
                                               : std::get<VCommandReply>(outcome.Get().Content));

@@ -152,7 +152,7 @@ private:
 
     std::string CheckCommandInformation(const VNode& element)
     {
-        const std::string refusal = CheckCommands(element);
+        std::string refusal = CheckCommands(element);
         if (!refusal.empty()) {
             return refusal;
         }

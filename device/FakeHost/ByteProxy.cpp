@@ -203,7 +203,7 @@ private:
             return -1;
         }
         const auto left = std::chrono::ceil<std::chrono::milliseconds>(due - now).count();
-        return static_cast<int>(std::clamp<std::int64_t>(left, 0, 3600 * 1000));
+        return static_cast<int>(std::clamp<std::int64_t>(left, 0, 3600000));
     }
 
     void ServePairs(const std::vector<pollfd>& descriptors)

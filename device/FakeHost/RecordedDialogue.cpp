@@ -96,6 +96,7 @@ std::optional<VRecordedRequest> ReadRequest(std::string text)
 std::vector<std::wstring> ToWide(const std::vector<std::string>& names)
 {
     std::vector<std::wstring> wide;
+    wide.reserve(names.size());
     for (const std::string& name : names) {
         wide.push_back(KVR::Utf8ToWide(name));
     }
@@ -115,6 +116,7 @@ std::vector<ControlSystem::IParameterInformation>
 ToWide(const std::vector<VParameterInformation>& parameters)
 {
     std::vector<ControlSystem::IParameterInformation> wide;
+    wide.reserve(parameters.size());
     for (const VParameterInformation& parameter : parameters) {
         wide.push_back({KVR::Utf8ToWide(parameter.Name), KVR::Utf8ToWide(parameter.Description)});
     }
@@ -260,7 +262,7 @@ std::wstring OutcomeKey(const std::wstring& name, const ControlSystem::IParamete
     // No text on the wire can hold a zero.
     std::wstring key = name + L'\0';
     for (const auto& [parameter, value] : parameters) {
-        key += parameter + L'\0' + value + L'\0';
+        key.append(parameter).append(1, L'\0').append(value).append(1, L'\0');
     }
     return key;
 }

@@ -161,8 +161,8 @@ std::vector<VRecordedMoment> ReadRecording(std::istream& input, const std::strin
             }
         }
         if (!reason.empty()) {
-            throw ControlStream::VError(ControlStream::EErrorKind::Usage,
-                                        name + ", line " + std::to_string(number) + ": " + reason);
+            reason.insert(0, name + ", line " + std::to_string(number) + ": ");
+            throw ControlStream::VError(ControlStream::EErrorKind::Usage, reason);
         }
         if (number > 1) {
             moments.push_back(std::move(moment));

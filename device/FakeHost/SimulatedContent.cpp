@@ -39,7 +39,7 @@ public:
     /// The hardware publishes events, and so ends before the dispatcher.
     ~VSimulatedContent() override
     {
-        SayFarewell();
+        VSimulatedContent::SayFarewell();
         hardware->Stop();
     }
 

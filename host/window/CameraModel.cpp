@@ -243,6 +243,7 @@ bool VCameraModel::SetSelected(const VRow& row, bool selected)
         numbers.erase(row.Number);
     }
     std::vector<VSelectionEntry> entries;
+    entries.reserve(numbers.size());
     for (const std::uint32_t number : numbers) {
         entries.emplace_back(CameraId(number));
     }
@@ -294,7 +295,7 @@ bool VCameraModel::ReadRow(const IDataVerifyReader& reader, VRow& row)
 
 void VCameraModel::MatchRows(const std::vector<std::uint32_t>& numbers)
 {
-    for (int i = rowCount() - 1; i >= 0; --i) {
+    for (int i = static_cast<int>(rows.size()) - 1; i >= 0; --i) {
         if (!std::binary_search(numbers.begin(), numbers.end(),
                                 rows[static_cast<std::size_t>(i)].Number)) {
             beginRemoveRows(QModelIndex(), i, i);
@@ -304,7 +305,8 @@ void VCameraModel::MatchRows(const std::vector<std::uint32_t>& numbers)
     }
     for (int i = 0; i < static_cast<int>(numbers.size()); ++i) {
         const std::uint32_t number = numbers[static_cast<std::size_t>(i)];
-        if (i == rowCount() || rows[static_cast<std::size_t>(i)].Number != number) {
+        if (i == static_cast<int>(rows.size()) ||
+            rows[static_cast<std::size_t>(i)].Number != number) {
             beginInsertRows(QModelIndex(), i, i);
             rows.insert(rows.begin() + i, MakeRow(number));
             endInsertRows();

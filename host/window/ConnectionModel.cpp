@@ -139,7 +139,8 @@ void VConnectionModel::Refresh()
     if (!sameRows) {
         endResetModel();
     } else if (!devices.empty()) {
-        emit dataChanged(index(0, 0), index(rowCount() - 1, ColumnCount - 1));
+        const int last = static_cast<int>(devices.size()) - 1;
+        emit dataChanged(index(0, 0), index(last, ColumnCount - 1));
     }
 }
 

@@ -110,7 +110,8 @@ void VLogModel::Refresh()
     if (added.empty()) {
         return;
     }
-    beginInsertRows(QModelIndex(), rowCount(), rowCount() + static_cast<int>(added.size()) - 1);
+    const auto first = static_cast<int>(lines.size());
+    beginInsertRows(QModelIndex(), first, first + static_cast<int>(added.size()) - 1);
     lines.insert(lines.end(), added.begin(), added.end());
     endInsertRows();
 
