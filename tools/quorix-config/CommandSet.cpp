@@ -70,7 +70,7 @@ private:
         }
         const VItem* item = file.Find(itemPath);
         VDataValue value;
-        const std::string reason = MakeValue(item, value);
+        std::string reason = MakeValue(item, value);
         if (!reason.empty()) {
             return reason;
         }
