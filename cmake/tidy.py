@@ -6,6 +6,7 @@ are not those of an earlier run without a finding. What passed is remembered by 
 user's cache folder, so that a fresh clone of unchanged sources has nothing to do.
 """
 
+import collections
 import concurrent.futures
 import hashlib
 import json
@@ -28,23 +29,28 @@ def compiler_arguments(entry):
     return words[:end]
 
 
-def fingerprint(entry, environment):
-    arguments = compiler_arguments(entry)
-    preprocessed = subprocess.run(
-        arguments + ["-E", "-P", entry["file"]], cwd=entry["directory"], capture_output=True, check=True
-    ).stdout
-    relative = " ".join(arguments).replace(str(top), "")
-    return hashlib.sha256(environment + relative.encode() + preprocessed).hexdigest()
+def fingerprint(entries, environment):
+    digest = hashlib.sha256(environment)
+    for entry in entries:
+        arguments = compiler_arguments(entry)
+        preprocessed = subprocess.run(
+            arguments + ["-E", "-P", entry["file"]], cwd=entry["directory"], capture_output=True, check=True
+        ).stdout
+        digest.update(" ".join(arguments).replace(str(top), "").encode() + preprocessed)
+    return digest.hexdigest()
 
 
-def check(entry, build, environment):
-    """Returns the findings in a source, empty where there are none."""
-    passed = cache / fingerprint(entry, environment)
+def check(source, entries, build, environment):
+    """Returns the findings in a source, empty where there are none, None where nothing changed.
+
+    clang-tidy itself goes through all the commands that compile the source.
+    """
+    passed = cache / fingerprint(entries, environment)
     if passed.exists():
         passed.touch()
         return None
     result = subprocess.run(
-        ["clang-tidy", "--quiet", "-p", build, entry["file"]], capture_output=True, text=True
+        ["clang-tidy", "--quiet", "-p", build, source], capture_output=True, text=True
     )
     if result.returncode == 0:
         passed.touch()
@@ -54,23 +60,22 @@ def check(entry, build, environment):
 
 def main():
     build, folders = sys.argv[1], [str(top / folder) + "/" for folder in sys.argv[2:]]
-    entries = [
-        entry
-        for entry in json.loads((pathlib.Path(build) / "compile_commands.json").read_text())
-        if any(entry["file"].startswith(folder) for folder in folders)
-    ]
+    sources = collections.defaultdict(list)
+    for entry in json.loads((pathlib.Path(build) / "compile_commands.json").read_text()):
+        if any(entry["file"].startswith(folder) for folder in folders):
+            sources[entry["file"]].append(entry)
     cache.mkdir(parents=True, exist_ok=True)
     environment = (top / ".clang-tidy").read_bytes()
     environment += subprocess.run(["clang-tidy", "--version"], capture_output=True).stdout
 
     ran = failed = 0
     with concurrent.futures.ThreadPoolExecutor(os.cpu_count()) as pool:
-        for findings in pool.map(lambda entry: check(entry, build, environment), entries):
+        for findings in pool.map(lambda source: check(*source, build, environment), sources.items()):
             ran += findings is not None
             failed += bool(findings)
             if findings:
                 print(findings)
-    print(f"clang-tidy: {len(entries)} sources, {ran} changed, {failed} with findings")
+    print(f"clang-tidy: {len(sources)} sources, {ran} changed, {failed} with findings")
     return 1 if failed else 0
 
 
