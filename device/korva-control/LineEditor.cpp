@@ -132,6 +132,18 @@ private:
         el_wset(editor, EL_ADDFN, L"complete-name", L"Complete a name", &CompleteWord);
         el_wset(editor, EL_BIND, L"^I", L"complete-name", nullptr);
         el_wset(editor, EL_BIND, L"^R", L"em-inc-search-prev", nullptr);
+        SetUpModes();
+    }
+
+    /// What is typed while a command runs is kept as it is: in the usual mode the terminal takes a
+    /// Ctrl-D for itself, and would echo the rest between the lines that the command prints.
+    /// Within a line Ctrl-C is a key like any other, since the signal overtakes what was typed
+    /// before it; while a command runs it is a signal, and ends the wait.
+    void SetUpModes()
+    {
+        el_wset(editor, EL_SETTY, L"-x", L"-icanon", L"-echo", nullptr);
+        el_wset(editor, EL_SETTY, L"-d", L"intr=", nullptr);
+        el_wset(editor, EL_BIND, L"^C", L"em-kill-line", nullptr);
     }
 
     /// Others on the machine need not know what was typed.
@@ -163,6 +175,9 @@ private:
                 break;
             case EShellInput::Resized:
                 el_resize(editor);
+                break;
+            case EShellInput::Resumed:
+                ShowAgain();
                 break;
             case EShellInput::Terminated:
             case EShellInput::Ended:
@@ -196,6 +211,14 @@ private:
         HideLine();
         input.Inbox().RunAll();
         std::fflush(stdout);
+        el_wset(editor, EL_REFRESH);
+    }
+
+    /// Takes the terminal back from the shell that had it while this program was stopped.
+    void ShowAgain()
+    {
+        el_wset(editor, EL_PREP_TERM, 0); // else the editor believes that its mode is still set
+        el_wset(editor, EL_PREP_TERM, 1);
         el_wset(editor, EL_REFRESH);
     }
 
@@ -295,6 +318,7 @@ std::optional<std::string> VLineEditor::ReadPlainLine()
             break;
         }
         case EShellInput::Resized:
+        case EShellInput::Resumed:
             break;
         case EShellInput::Interrupted:
         case EShellInput::Terminated:

@@ -323,6 +323,7 @@ TResult VShell::Await(const TStart& start)
         case EShellInput::Ready:
         case EShellInput::Ended:
         case EShellInput::Resized:
+        case EShellInput::Resumed:
             break;
         }
     }

@@ -14,6 +14,7 @@ VShellInput::VShellInput(VShellInbox& shellInbox) : inbox(shellInbox)
     sigaddset(&heard, SIGINT);
     sigaddset(&heard, SIGTERM);
     sigaddset(&heard, SIGWINCH);
+    sigaddset(&heard, SIGCONT);
     pthread_sigmask(SIG_BLOCK, &heard, &previous);
     signals = signalfd(-1, &heard, SFD_CLOEXEC | SFD_NONBLOCK);
     if (signals < 0) {
@@ -69,6 +70,8 @@ EShellInput VShellInput::ReadSignal()
         return EShellInput::Interrupted;
     case SIGWINCH:
         return EShellInput::Resized;
+    case SIGCONT:
+        return EShellInput::Resumed;
     default:
         terminated = true;
         return EShellInput::Terminated;

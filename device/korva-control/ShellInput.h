@@ -7,11 +7,11 @@
 #include <string>
 
 /// Why a wait for input ended.
-enum class EShellInput { Ready, Ended, Interrupted, Terminated, Resized, Posted };
+enum class EShellInput { Ready, Ended, Interrupted, Terminated, Resized, Resumed, Posted };
 
 /// The shell's three sources: what is typed, what other threads post, and signals.
 ///
-/// Owns: the blocking of SIGINT, SIGTERM and SIGWINCH, put back in the end, and the descriptor that
+/// Owns: the blocking of SIGINT, SIGTERM, SIGWINCH and SIGCONT, put back in the end, and the descriptor that
 /// hears them. To be made before any thread. Threads: the main thread.
 class VShellInput
 {

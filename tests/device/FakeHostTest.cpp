@@ -4,6 +4,7 @@
 #include "FakeHost/RecordedContent.h"
 #include "FakeHost/SimulatedContent.h"
 #include "device/ClientSupport.h"
+#include "device/ReservedPort.h"
 
 #include <gmock/gmock.h>
 
@@ -135,11 +136,11 @@ TEST(FakeOperator, GivesThePlaceToOneDeviceAtATime)
 
 TEST(AsyncClientWithFakeHost, IsAuthorizedAnewByEachHost)
 {
+    const VReservedPort port;
     auto host = std::make_unique<VFakeHost>(
-        FakeHost::MakeSimulatedContent(1, {EDecision::AskAllow, 1ms}), 0);
-    const std::uint16_t port = host->Port();
+        FakeHost::MakeSimulatedContent(1, {EDecision::AskAllow, 1ms}), port.Number());
     VAsyncOptions options;
-    options.Port = port;
+    options.Port = port.Number();
     options.BackOff = VBackOffOptions{1ms, 20ms, 0.0};
     options.Device = VDeviceIdentity{"d", "n"};
     VAsyncClient client(options);
@@ -152,7 +153,8 @@ TEST(AsyncClientWithFakeHost, IsAuthorizedAnewByEachHost)
     ASSERT_TRUE(client.WaitFor(
         [](const VAsyncStatus& status) { return status.State != EConnectionState::Connected; },
         Patient));
-    const VFakeHost next(FakeHost::MakeSimulatedContent(1, {EDecision::AskAllow, 1ms}), port);
+    const VFakeHost next(FakeHost::MakeSimulatedContent(1, {EDecision::AskAllow, 1ms}),
+                         port.Number());
 
     EXPECT_TRUE(client.WaitFor(authorized, Patient));
 }

@@ -378,16 +378,16 @@ TEST(ProgramWatch, ShowsOnlyTheCamerasThatWereChosenWithTheTime)
 
     setStrobe("1");
     setStrobe("2");
+    const std::string setting = watcher.ReadLine().value_or("nothing"); // else the other overtakes
     RunProgram(
         At(host.Port(), {"run", "CameraSettings_SetSelection", "Param_CameraSelection=1,3"}));
     RunProgram(
         At(host.Port(), {"run", "CameraSettings_SetSelection", "Param_CameraSelection=1,4"}));
 
-    const VOutcome outcome = watcher.Finish();
-    EXPECT_THAT(outcome.Output,
-                MatchesRegex("[0-9]{4}-[0-9]{2}-[0-9]{2}T[0-9:]{8}[.][0-9]{3}Z "
-                             "Event.Cameras.SettingChanged CameraId=2 [^\n]*\n[^\n]* "
-                             "Event.Cameras.SelectionChanged SelectedCameraIds=1,4\n"));
+    EXPECT_THAT(setting, MatchesRegex("[0-9]{4}-[0-9]{2}-[0-9]{2}T[0-9:]{8}[.][0-9]{3}Z "
+                                      "Event.Cameras.SettingChanged CameraId=2 [^\n]*"));
+    EXPECT_THAT(watcher.Finish().Output,
+                MatchesRegex("[^\n]* Event.Cameras.SelectionChanged SelectedCameraIds=1,4\n"));
 }
 
 TEST(ProgramWatch, PutsTheTimeIntoJson)

@@ -12,6 +12,7 @@
 #include <pty.h>
 #include <sys/ioctl.h>
 #include <sys/wait.h>
+#include <termios.h>
 #include <unistd.h>
 
 /// A korva-control at a terminal that the test types into and reads.
@@ -86,7 +87,9 @@ public:
         return text;
     }
 
-    /// Waits for the end. @return the exit code, or 128 and the number of a signal
+    /// Waits for the end; the test fails by a throw where it does not come.
+    ///
+    /// @return the exit code, or 128 and the number of a signal
     int Finish()
     {
         while (ReadSome()) {
@@ -99,14 +102,30 @@ public:
 
     void Signal(int number) const { kill(pid, number); }
 
+    /// Stops the program and goes on with it, as a person does by Ctrl-Z and "fg": in between the
+    /// terminal is set as the person's own shell has it.
+    void StopAndGoOn() const
+    {
+        int status = 0;
+        termios modes{};
+        kill(pid, SIGSTOP);
+        if (waitpid(pid, &status, WUNTRACED) != pid || !WIFSTOPPED(status) ||
+            tcgetattr(terminal, &modes) != 0) {
+            throw std::runtime_error("the program does not stop");
+        }
+        modes.c_lflag |= ICANON | ECHO | ISIG;
+        tcsetattr(terminal, TCSANOW, &modes);
+        kill(pid, SIGCONT);
+    }
+
 private:
-    /// @return false at the end, or where nothing comes any more
+    /// @return false at the end; the test fails by a throw where nothing comes any more
     bool ReadSome()
     {
         pollfd descriptor{terminal, POLLIN, 0};
         char bytes[4096];
-        if (poll(&descriptor, 1, 60000) <= 0) {
-            return false;
+        if (poll(&descriptor, 1, 60000) == 0) {
+            throw std::runtime_error("nothing more on the screen but: " + screen);
         }
         const ssize_t count = read(terminal, bytes, sizeof bytes);
         if (count <= 0) {
