@@ -211,13 +211,18 @@ bool VValueTextReader::TakeWord(const char* word)
     return true;
 }
 
+/// Takes a pair of brackets with nothing in it, or leaves the cursor where it is.
 bool VValueTextReader::TakeEmpty(char open, char close)
 {
-    if (!cursor.Take(open)) {
-        return false;
+    const char* const start = cursor.Position;
+    if (cursor.Take(open)) {
+        cursor.SkipBlanks();
+        if (cursor.Take(close)) {
+            return true;
+        }
+        cursor.Position = start;
     }
-    cursor.SkipBlanks();
-    return cursor.Take(close);
+    return false;
 }
 
 bool VValueTextReader::TakeString(std::string& characters)

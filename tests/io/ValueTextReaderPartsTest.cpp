@@ -64,6 +64,9 @@ TEST(ValueTextReader, TupleWithoutMembersTakesEmptyBrackets)
     EXPECT_EQ(Good({}), Read(ArrayOf(byte, 0), "[]"));
     EXPECT_EQ(Good({}), Read(ArrayOf(byte, 0), "{}"));
     EXPECT_TRUE(Fails(TupleOf({}), "[}"));
+    EXPECT_TRUE(Fails(TupleOf({}), "[{}"));
+    EXPECT_TRUE(Fails(TupleOf({}), "[ {}"));
+    EXPECT_TRUE(Fails(ArrayOf(byte, 0), "[{}]"));
     EXPECT_TRUE(Fails(TupleOf({}), "[1]"));
     EXPECT_TRUE(Fails(TupleOf({}), ""));
     EXPECT_EQ(Good({}), Read(TupleOf({TupleOf({})}), "{}", SchemaTextModeRow));
