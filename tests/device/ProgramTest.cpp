@@ -1,7 +1,6 @@
 #include "device/ClientSupport.h"
 #include "device/ProgramSupport.h"
 
-#include <functional>
 #include <future>
 
 #include <gmock/gmock.h>
@@ -9,7 +8,6 @@
 namespace {
 
 using testing::AllOf;
-using testing::EndsWith;
 using testing::HasSubstr;
 using testing::StartsWith;
 using namespace std::string_literals;
