@@ -15,6 +15,9 @@ VQuickWidgetManager::VQuickWidgetManager(const QString& sourceFolder, bool reloa
     engine->addImportPath(QStringLiteral("qrc:/"));
     if (ReloadEnabled) {
         engine->addImportPath(sourceFolder);
+        // Qt keeps QML compiled on disk and knows a changed file by its time alone: a second edit
+        // within that time's few milliseconds, or a file copied with its old time, would be missed.
+        qputenv("QML_DISABLE_DISK_CACHE", "1");
     }
 }
 

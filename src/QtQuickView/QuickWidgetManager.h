@@ -18,7 +18,8 @@ class VQuickWidgetManager : public QObject
 public:
     /// @param sourceFolder   the QML sources on disk, only read where `reloadEnabled` is set
     /// @param reloadEnabled  whether a file of that folder wins over the compiled-in one, and views
-    /// load again when told to
+    /// load again when told to. Such a manager has to be made before the process loads any QML: Qt
+    /// decides then and for good whether it may show QML that it has kept from an earlier load.
     VQuickWidgetManager(const QString& sourceFolder, bool reloadEnabled);
     ~VQuickWidgetManager() override;
 

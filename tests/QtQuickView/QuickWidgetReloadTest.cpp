@@ -1,6 +1,27 @@
 #include "QmlFolder.h"
 
+#include <QDateTime>
 #include <QPointer>
+
+namespace {
+
+/// Makes a manager with reloading before any test does without: what Qt keeps of QML on disk is
+/// settled once for the process, as it is in a developer's host.
+class VDevelopersProcess : public testing::Environment
+{
+    void SetUp() override { const VQmlFolder folder; }
+};
+
+const auto* const developersProcess = testing::AddGlobalTestEnvironment(new VDevelopersProcess);
+
+void SetTime(const QString& path, const QDateTime& time)
+{
+    QFile file(path);
+    ASSERT_TRUE(file.open(QIODevice::ReadWrite));
+    ASSERT_TRUE(file.setFileTime(time, QFileDevice::FileModificationTime));
+}
+
+} // namespace
 
 TEST(QuickWidgetReload, MakesTheRootItemAnewAndKeepsTheValues)
 {
@@ -33,6 +54,24 @@ TEST(QuickWidgetReload, ShowsWhatTheFileHoldsByNow)
 {
     VQmlView view("Item { objectName: 'old' }");
     view.Folder().Write("View.qml", "import QtQuick 2.0\nItem { objectName: 'new' }");
+
+    view.Widget().ReloadQML();
+
+    ASSERT_NE(nullptr, view.Root());
+    EXPECT_EQ("new", view.Root()->objectName());
+}
+
+TEST(QuickWidgetReload, ShowsAFileThatWasReplacedByOneOfTheSameTime)
+{
+    VQmlView view;
+    const QString path = view.Folder().Path() + "/View.qml";
+    const QDateTime time = QDateTime::fromSecsSinceEpoch(1000000000);
+    view.Folder().Write("View.qml", "import QtQuick 2.0\nItem { objectName: 'old' }");
+    SetTime(path, time);
+    view.Widget().SetSource(view.Folder().Path(), "View.qml");
+    ASSERT_EQ("old", view.Root()->objectName());
+    view.Folder().Write("View.qml", "import QtQuick 2.0\nItem { objectName: 'new' }");
+    SetTime(path, time);
 
     view.Widget().ReloadQML();
 
