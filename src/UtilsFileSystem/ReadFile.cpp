@@ -4,8 +4,6 @@
 
 #include <boost/filesystem/operations.hpp>
 
-#include <algorithm>
-
 namespace UtilsFileSystem {
 
 std::optional<std::string> ReadFile(const boost::filesystem::path& path, std::size_t limit)
@@ -22,7 +20,9 @@ std::optional<std::string> ReadFile(const boost::filesystem::path& path, std::si
     std::string content;
     while (stream) {
         const std::size_t size = content.size();
-        const std::size_t wanted = std::min(pieceSize, limit + 1 - size);
+        const std::size_t left = limit - size;
+        // One byte more than is left shows that the file is greater.
+        const std::size_t wanted = left < pieceSize ? left + 1 : pieceSize;
         content.resize(size + wanted);
         stream.read(&content[size], static_cast<std::streamsize>(wanted));
         content.resize(size + static_cast<std::size_t>(stream.gcount()));

@@ -6,6 +6,7 @@
 
 #include <gmock/gmock.h>
 
+#include <limits>
 #include <set>
 #include <stdexcept>
 #include <sys/stat.h>
@@ -225,6 +226,15 @@ TEST(ReadFile, ReadsUpToItsLimit)
     EXPECT_EQ(ReadFile(folder.Path("f"), content.size()), content);
     EXPECT_EQ(ReadFile(folder.Path("f"), content.size() - 1), std::nullopt);
     EXPECT_EQ(ReadFile(folder.Path("empty"), 0), "");
+    EXPECT_EQ(ReadFile(folder.Path("f"), 0), std::nullopt);
+}
+
+TEST(ReadFile, TakesTheGreatestLimitForNone)
+{
+    const VTemporaryFolder folder;
+    WriteFile(folder.Path("f"), "content");
+
+    EXPECT_EQ(ReadFile(folder.Path("f"), std::numeric_limits<std::size_t>::max()), "content");
 }
 
 TEST(ReadFile, TakesNothingButRegularFiles)
