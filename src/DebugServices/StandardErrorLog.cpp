@@ -27,21 +27,37 @@ spdlog::level::level_enum NamedLevel(int level)
     }
 }
 
+void AppendCode(std::string& line, unsigned char byte)
+{
+    static const char digits[] = "0123456789ABCDEF";
+    line += {'\\', 'x', digits[byte >> 4], digits[byte & 0xF]};
+}
+
+/// Whether a byte and the one behind it are a control character beyond ASCII, in UTF-8. Among these
+/// is one that begins an escape sequence by itself.
+bool IsLateControl(unsigned char byte, unsigned char next)
+{
+    return byte == 0xC2 && next >= 0x80 && next < 0xA0;
+}
+
 /// Returns the text with its control characters written out. Messages hold what devices sent, and a
 /// line feed or a terminal's escape sequence of theirs must not pass for a line of this log.
 std::string OnOneLine(const std::string& text)
 {
-    static const char digits[] = "0123456789ABCDEF";
     std::string line;
     line.reserve(text.size());
-    for (const char character : text) {
-        const auto byte = static_cast<unsigned char>(character);
-        if (character == '\n') {
+    for (std::size_t i = 0; i < text.size(); ++i) {
+        const auto byte = static_cast<unsigned char>(text[i]);
+        if (byte == '\n') {
             line += "\\n";
-        } else if (character != '\t' && (byte < 0x20 || byte == 0x7F)) {
-            line += {'\\', 'x', digits[byte >> 4], digits[byte & 0xF]};
+        } else if (byte != '\t' && (byte < 0x20 || byte == 0x7F)) {
+            AppendCode(line, byte);
+        } else if (i + 1 < text.size() &&
+                   IsLateControl(byte, static_cast<unsigned char>(text[i + 1]))) {
+            AppendCode(line, byte);
+            AppendCode(line, static_cast<unsigned char>(text[++i]));
         } else {
-            line += character;
+            line += text[i];
         }
     }
     return line;

@@ -156,6 +156,16 @@ TEST(Log, WritesControlCharactersOut)
     EXPECT_THAT(Written("x", "Two\nlines", 2), testing::EndsWith("[Two\\nlines] x\n"));
 }
 
+TEST(Log, WritesControlCharactersBeyondAsciiOut)
+{
+    EXPECT_THAT(Written("a\xC2\x9B"
+                        "2Jb\xC2\x80\xC2\x9F",
+                        "Config", 2),
+                testing::EndsWith("] a\\xC2\\x9B2Jb\\xC2\\x80\\xC2\\x9F\n"));
+    EXPECT_THAT(Written("\xC2\xA0\xC3\x9B\xE2\x80\x9B\xC2", "Config", 2),
+                testing::EndsWith("] \xC2\xA0\xC3\x9B\xE2\x80\x9B\xC2\n"));
+}
+
 TEST(Log, IsReplacedAndBroughtBack)
 {
     KVR::ILogCategorised& before = KVR::GlobalLog();
