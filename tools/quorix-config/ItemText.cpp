@@ -10,17 +10,45 @@
 
 namespace QuorixConfig {
 
+namespace {
+
+unsigned char ByteAt(const std::string& text, std::size_t index)
+{
+    return index < text.size() ? static_cast<unsigned char>(text[index]) : 0;
+}
+
+/// Returns how many bytes from here are a control character. U+0080 to U+009F take two, and there
+/// are terminals that obey them like an escape sequence.
+std::size_t ControlLength(const std::string& text, std::size_t index)
+{
+    const unsigned char byte = ByteAt(text, index);
+    if (byte < 0x20 || byte == 0x7F) {
+        return 1;
+    }
+    const unsigned char next = ByteAt(text, index + 1);
+    return byte == 0xC2 && next >= 0x80 && next <= 0x9F ? 2 : 0;
+}
+
+std::string ByteNumber(unsigned char byte)
+{
+    char number[8];
+    std::snprintf(number, sizeof number, "\\x%02X", byte);
+    return number;
+}
+
+} // namespace
+
 std::string Printable(const std::string& text)
 {
     std::string printable;
-    for (const char character : text) {
-        const auto byte = static_cast<unsigned char>(character);
-        if (byte < 0x20 || byte == 0x7F) {
-            char number[8];
-            std::snprintf(number, sizeof number, "\\x%02X", byte);
-            printable += number;
+    std::size_t controls = 0; // bytes that are yet to be written as numbers
+    for (std::size_t index = 0; index < text.size(); ++index) {
+        controls = controls != 0 ? controls : ControlLength(text, index);
+        if (controls != 0) {
+            printable += ByteNumber(ByteAt(text, index));
+            --controls;
         } else {
-            printable += character;
+            printable += text[index];
         }
     }
     return printable;

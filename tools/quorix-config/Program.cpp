@@ -48,6 +48,17 @@ std::vector<std::unique_ptr<ICommand>> MakeCommands()
     return commands;
 }
 
+/// Runs a command. What was not written, to a full disk for example, must not pass for done.
+int RunCommand(ICommand& command, std::ostream& output, std::ostream& errors)
+{
+    const int code = command.Run(output, errors);
+    if (!output.flush()) {
+        errors << "quorix-config: The output cannot be written\n";
+        return code == done ? failed : code;
+    }
+    return code;
+}
+
 } // namespace
 
 int RunProgram(int argumentCount, const char* const* arguments, std::ostream& output,
@@ -67,7 +78,7 @@ int RunProgram(int argumentCount, const char* const* arguments, std::ostream& ou
         application.parse(argumentCount, arguments);
         for (const auto& [subcommand, command] : declared) {
             if (subcommand->parsed()) {
-                return command->Run(output, errors);
+                return RunCommand(*command, output, errors);
             }
         }
     } catch (const CLI::Success& success) { // help and version

@@ -4,6 +4,8 @@
 #include <gmock/gmock.h>
 #include <nlohmann/json.hpp>
 
+#include <fstream>
+
 using ConfigTest::RunTool;
 using ConfigTest::VRun;
 using testing::AllOf;
@@ -77,6 +79,25 @@ TEST_F(QuorixConfigTest, MessagesCannotDriveATerminal)
                     "</Configuration>");
 
     EXPECT_THAT(RunTool({"check", path}).Output, HasSubstr("Node[@name='\\x1B[2J']"));
+}
+
+TEST_F(QuorixConfigTest, MessagesCannotDriveATerminalByItsEightBitControls)
+{
+    WriteFile(path, "<Configuration version='2.0'><Node name='\xC2\x9B\xC2\xA0\xC3\x9B\xC2'><Node/>"
+                    "</Node></Configuration>");
+
+    EXPECT_THAT(RunTool({"check", path}).Output,
+                HasSubstr("Node[@name='\\xC2\\x9B\xC2\xA0\xC3\x9B\xC2']"));
+}
+
+TEST_F(QuorixConfigTest, OutputThatCannotBeWrittenIsAFailure)
+{
+    std::ofstream full("/dev/full");
+    std::ostringstream errors;
+    const char* const arguments[] = {"quorix-config", "list", path.c_str()};
+
+    EXPECT_EQ(QuorixConfig::RunProgram(3, arguments, full, errors), 1);
+    EXPECT_EQ(errors.str(), "quorix-config: The output cannot be written\n");
 }
 
 TEST_F(QuorixConfigTest, TellsWhyAFileCannotBeRead)
