@@ -43,8 +43,9 @@ set(QUORIX_TEST_ENVIRONMENT
     "LSAN_OPTIONS=suppressions=${PROJECT_SOURCE_DIR}/tests/support/lsan.supp:print_suppressions=0"
     "DBUS_SYSTEM_BUS_ADDRESS=unix:path=/nonexistent/bus"
     "AVAHI_COMPAT_NOWARN=1"
-    # Hosts that a test starts keep their files here and not in the user's home.
+    # Programs that a test starts keep their files here and not in the user's home.
     "XDG_DATA_HOME=${PROJECT_BINARY_DIR}/test-data"
+    "XDG_CACHE_HOME=${PROJECT_BINARY_DIR}/test-cache"
 )
 
 # Without the software backend a Quick view needs OpenGL, which the offscreen platform does not have.

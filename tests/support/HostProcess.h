@@ -261,15 +261,18 @@ private:
         int ends[2] = {-1, -1}; // to read from, to write to
     };
 
-    /// Returns the test's environment with a data folder of the host's own, so that nothing that
-    /// one host remembers is met by another. Anybody may write to it, as a host may be another
-    /// user.
+    /// Returns the test's environment with folders of the host's own for data and caches, so that
+    /// nothing that one host remembers is met by another. Anybody may write to them, as a host may
+    /// be another user.
     std::vector<std::string> Environment() const
     {
         chmod(dataHome.Path().c_str(), 0777);
-        std::vector<std::string> settings{"XDG_DATA_HOME=" + dataHome.Path()};
+        chmod(cacheHome.Path().c_str(), 0777);
+        std::vector<std::string> settings{"XDG_DATA_HOME=" + dataHome.Path(),
+                                          "XDG_CACHE_HOME=" + cacheHome.Path()};
         for (char** setting = environ; *setting != nullptr; ++setting) {
-            if (std::strncmp(*setting, "XDG_DATA_HOME=", 14) != 0) {
+            if (std::strncmp(*setting, "XDG_DATA_HOME=", 14) != 0 &&
+                std::strncmp(*setting, "XDG_CACHE_HOME=", 15) != 0) {
                 settings.emplace_back(*setting);
             }
         }
@@ -316,7 +319,8 @@ private:
         errors.emplace(errorPipe.ends[0]);
     }
 
-    const VTemporaryFolder dataHome; // gone after the process
+    const VTemporaryFolder dataHome;  // gone after the process
+    const VTemporaryFolder cacheHome; // likewise
     pid_t pid = -1;
     int processDescriptor = -1; // becomes readable when the process ends
     int input = -1;

@@ -1,11 +1,15 @@
 #include <gmock/gmock.h>
 
 #include <QApplication>
+#include <QTemporaryDir>
 
 /// Runs the tests of a binary below one QApplication. Run by hand the binary needs no environment:
-/// windows stay in memory and are drawn by software unless something else is asked for.
+/// windows stay in memory and are drawn by software unless something else is asked for. What Qt and
+/// graphics drivers keep between two runs goes with the test and not into the user's home.
 int main(int argumentCount, char** arguments)
 {
+    const QTemporaryDir cache;
+    qputenv("XDG_CACHE_HOME", cache.path().toLocal8Bit());
     if (!qEnvironmentVariableIsSet("QT_QPA_PLATFORM")) {
         qputenv("QT_QPA_PLATFORM", "offscreen");
     }

@@ -34,6 +34,7 @@ class QuorixHost:
         environment = {
             **os.environ,
             "XDG_RUNTIME_DIR": self._folder.name,
+            "XDG_CACHE_HOME": os.path.join(self._folder.name, "cache"),
             "QT_QPA_PLATFORM": "offscreen",
             "QT_QUICK_BACKEND": "software",
             # What a test advertises must not reach the machine's own network.
