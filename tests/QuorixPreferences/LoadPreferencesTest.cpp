@@ -217,6 +217,28 @@ TEST_F(LoadPreferencesTest, MessagesOfAFileAreLoggedAndTheRestIsLoaded)
                             "Node[@name='User']\")"));
 }
 
+TEST_F(LoadPreferencesTest, AFileOfAnotherVersionGivesNothingButALegacySwitchAndItsChecks)
+{
+    host.Features = {4};
+    TestSupport::WriteFile(UserFile(),
+                           "<Configuration version='2.1'><Node name='Preferences'><Node "
+                           "name='User'>" +
+                               StringItem("Other", "new") + StringItem("AltToSelect", "false") +
+                               "</Node></Node></Configuration>");
+
+    Load();
+
+    EXPECT_FALSE(Exists("Preferences.User.Other"));
+    EXPECT_EQ(SwitchOf("Preferences.User.AltToSelect"), "false");
+    EXPECT_THAT(
+        Logged(),
+        ElementsAre(LoadingUser(), StartsWith("DataStore 3 "),
+                    "DataStore 2 Cannot load Quorix configuration file with version 2.1, maximum "
+                    "supported version is 2.0",
+                    "Preferences 2 Objects folder '" + Default(18) + "' not accessible.",
+                    "Preferences 2 Using default folder for Objects: '" + Default(18) + "'."));
+}
+
 TEST_F(LoadPreferencesTest, UserFoldersAreCheckedInOrder)
 {
     MakeFolder("19");
