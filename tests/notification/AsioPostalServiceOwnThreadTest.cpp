@@ -207,12 +207,14 @@ TEST(AsioPostalServiceOwnThread, StartsAgainAfterTheQueueHasRunEmpty)
             service.Stop();
         },
         0);
-    ASSERT_TRUE(ended.Wait()); // the I/O service has marked itself as stopped by now
+    ASSERT_TRUE(ended.Wait());
+    EXPECT_TRUE(service.GetIOService().stopped()); // it has marked itself so
     VLatch called;
     service.Post([&called] { called.CountDown(); }, 0);
 
     EXPECT_TRUE(service.Start(1));
 
+    EXPECT_FALSE(service.GetIOService().stopped());
     EXPECT_TRUE(called.Wait());
 }
 

@@ -81,6 +81,15 @@ TEST(AsioPostalService, StopLetsTheQueueRunEmpty)
     EXPECT_EQ(100, calls);
 }
 
+TEST(AsioPostalService, StopLeavesAnIOServiceThatIsNotMarkedAsStopped)
+{
+    VAsioPostalService service("X", 1, 0);
+
+    service.Stop();
+
+    EXPECT_FALSE(service.GetIOService().stopped());
+}
+
 TEST(AsioPostalService, StopWaitsForPendingOperations)
 {
     VAsioPostalService service("X", 1, 0);
