@@ -2,6 +2,8 @@
 
 #include <algorithm>
 
+#include <CLI/CLI.hpp>
+
 namespace {
 
 // No text that is sent can hold it, and a word that begins with it is marked once more.
@@ -48,4 +50,16 @@ std::string CheckWhole(const std::string& text)
 {
     const bool good = !text.empty() && text.find_first_not_of("0123456789") == std::string::npos;
     return good ? std::string() : "\"" + text + "\" is no whole number from 0 on";
+}
+
+std::function<std::string(const std::string&)> CheckNumber(int greatest)
+{
+    return [greatest](const std::string& text) {
+        double number = 0;
+        // Comparisons with what is not a number are false.
+        const bool good =
+            CLI::detail::lexical_cast(text, number) && number >= 0 && number <= greatest;
+        return good ? std::string()
+                    : "\"" + text + "\" is no number from 0 to " + std::to_string(greatest);
+    };
 }

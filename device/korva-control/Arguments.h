@@ -1,5 +1,6 @@
 #pragma once
 
+#include <functional>
 #include <string>
 #include <vector>
 
@@ -20,3 +21,7 @@ std::string PlainMessage(std::string message);
 /// Says what is wrong with a text that should be a whole number without a sign; empty where it is
 /// one. The parser would take a negative number for a very great one.
 std::string CheckWhole(const std::string& text);
+
+/// Returns a check that says what is wrong with a text that should be a number from 0 on. The
+/// parser's own lets pass what is not a number, since that is neither below nor above anything.
+std::function<std::string(const std::string&)> CheckNumber(int greatest);

@@ -30,7 +30,8 @@ public:
             ->required()
             ->transform(&PlainWord);
         command->add_option("--speed", speed, "How many times as fast; 0 leaves out the pauses")
-            ->check(CLI::Range(0.0, 1000000.0))
+            ->check(CheckNumber(1000000))
+            ->type_name("FACTOR")
             ->capture_default_str();
         return command;
     }

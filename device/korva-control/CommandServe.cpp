@@ -26,6 +26,8 @@ const std::map<std::string, EDecision> Decisions{
     {"ask-nobody", EDecision::AskNobody},
 };
 
+constexpr int SecondsOfADay = 86400;
+
 class VCommandServe : public ICommand
 {
 public:
@@ -80,11 +82,11 @@ private:
             command
                 .add_option("--authorize", decision,
                             "What becomes of a device that asks for authorization")
-                ->transform(CLI::CheckedTransformer(Decisions).description(""))
+                ->check(CLI::IsMember(Decisions).description(""))
                 ->type_name("allow|deny|ask-allow|ask-deny|ask-nobody");
         command
             .add_option("--thinking", thinking, "How many seconds the operator takes, where asked")
-            ->check(CLI::Range(0.0, 86400.0))
+            ->check(CheckNumber(SecondsOfADay))
             ->type_name("SECONDS")
             ->capture_default_str();
         command.add_option("--replay", recording, "Say again what the host said in this recording")
@@ -98,7 +100,7 @@ private:
     {
         const std::string group = "Faults";
         command.add_option("--delay", delay, "The host's bytes come so many seconds late")
-            ->check(CLI::Range(0.0, 86400.0))
+            ->check(CheckNumber(SecondsOfADay))
             ->type_name("SECONDS")
             ->group(group);
         command
@@ -130,7 +132,8 @@ private:
     {
         if (recording.empty()) {
             return FakeHost::MakeSimulatedContent(
-                cameras, {decision, std::chrono::milliseconds(std::lround(thinking * 1000))});
+                cameras,
+                {Decisions.at(decision), std::chrono::milliseconds(std::lround(thinking * 1000))});
         }
         std::ifstream file(recording, std::ios::binary);
         if (!file) {
@@ -162,7 +165,7 @@ private:
 
     std::optional<int> listen;
     std::uint32_t cameras = 4;
-    EDecision decision = EDecision::Allow;
+    std::string decision = "allow";
     double thinking = 1;
     std::string recording;
     double delay = 0;
