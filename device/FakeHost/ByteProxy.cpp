@@ -49,15 +49,30 @@ int OpenListener(std::uint16_t port, std::uint16_t& chosen)
     return listener;
 }
 
-int ConnectTo(const sockaddr_in& host)
+/// Waits for a connection that is being made. @return false where it failed, or `stop` became
+/// readable first
+bool WaitUntilConnected(int connecting, int stop)
 {
-    const int connected = socket(AF_INET, SOCK_STREAM | SOCK_CLOEXEC, 0);
-    if (connected >= 0 &&
-        connect(connected, reinterpret_cast<const sockaddr*>(&host), sizeof host) != 0) {
-        close(connected);
-        return -1;
+    // All other connections wait as long, and a host that is there takes a moment.
+    constexpr int limitMilliseconds = 5000;
+    pollfd descriptors[] = {{stop, POLLIN, 0}, {connecting, POLLOUT, 0}};
+    int error = 0;
+    socklen_t size = sizeof error;
+    return poll(descriptors, 2, limitMilliseconds) > 0 && descriptors[0].revents == 0 &&
+           getsockopt(connecting, SOL_SOCKET, SO_ERROR, &error, &size) == 0 && error == 0;
+}
+
+/// @return -1 where the host takes no connection
+int ConnectTo(const sockaddr_in& host, int stop)
+{
+    const int connected = socket(AF_INET, SOCK_STREAM | SOCK_CLOEXEC | SOCK_NONBLOCK, 0);
+    if (connected < 0 ||
+        connect(connected, reinterpret_cast<const sockaddr*>(&host), sizeof host) == 0 ||
+        (errno == EINPROGRESS && WaitUntilConnected(connected, stop))) {
+        return connected;
     }
-    return connected;
+    close(connected);
+    return -1;
 }
 
 void SendAtOnce(int socket)
@@ -160,12 +175,8 @@ private:
 class VByteProxy::VLoop
 {
 public:
-    VLoop(int listeningSocket, int stopDescriptor, const sockaddr_in& hostAddress,
-          MakeFilter filterMaker)
-        : listener(listeningSocket),
-          stop(stopDescriptor),
-          host(hostAddress),
-          makeFilter(std::move(filterMaker))
+    VLoop(int listeningSocket, int stopDescriptor, const sockaddr_in& hostAddress)
+        : listener(listeningSocket), stop(stopDescriptor), host(hostAddress)
     {
     }
 
@@ -174,7 +185,7 @@ public:
     VLoop(const VLoop&) = delete;
     VLoop& operator=(const VLoop&) = delete;
 
-    void Run()
+    void Run(const MakeFilter& makeFilter)
     {
         std::vector<pollfd> descriptors;
         for (;;) {
@@ -187,11 +198,12 @@ public:
             }
             poll(descriptors.data(), descriptors.size(), Milliseconds(due, before));
             if (descriptors[0].revents != 0) {
+                pairs.clear();
                 return;
             }
             ServePairs(descriptors);
             if (descriptors[1].revents != 0) {
-                Accept();
+                Accept(makeFilter);
             }
         }
     }
@@ -217,13 +229,13 @@ private:
         }
     }
 
-    void Accept()
+    void Accept(const MakeFilter& makeFilter)
     {
         const int device = accept4(listener, nullptr, nullptr, SOCK_CLOEXEC);
         if (device < 0) {
             return; // gone again, or no descriptor is free: the next turn tries anew
         }
-        const int connected = ConnectTo(host);
+        const int connected = ConnectTo(host, stop);
         if (connected < 0) {
             close(device);
             return;
@@ -234,32 +246,43 @@ private:
     const int listener;
     const int stop;
     const sockaddr_in host;
-    const MakeFilter makeFilter;
     unsigned accepted = 0;
     std::list<VPair> pairs;
 };
 
-VByteProxy::VByteProxy(std::uint16_t port, const sockaddr_in& host, MakeFilter makeFilter)
-    : stop(eventfd(0, EFD_CLOEXEC))
+VByteProxy::VByteProxy(std::uint16_t port, const sockaddr_in& host) : stop(eventfd(0, EFD_CLOEXEC))
 {
     if (stop < 0) {
         Fail("no descriptor is free");
     }
     try {
         const int listener = OpenListener(port, listeningPort);
-        auto loop = std::make_shared<VLoop>(listener, stop, host, std::move(makeFilter));
-        thread = std::thread([loop] { loop->Run(); });
+        loop = std::make_shared<VLoop>(listener, stop, host);
     } catch (...) {
         close(stop);
         throw;
     }
 }
 
+VByteProxy::VByteProxy(std::uint16_t port, const sockaddr_in& host, MakeFilter makeFilter)
+    : VByteProxy(port, host)
+{
+    Start(std::move(makeFilter));
+}
+
 VByteProxy::~VByteProxy()
 {
     eventfd_write(stop, 1);
-    thread.join();
+    if (thread.joinable()) {
+        thread.join();
+    }
     close(stop);
+}
+
+void VByteProxy::Start(MakeFilter makeFilter)
+{
+    thread =
+        std::thread([running = loop, filters = std::move(makeFilter)] { running->Run(filters); });
 }
 
 sockaddr_in LoopbackAddress(std::uint16_t port)

@@ -46,9 +46,13 @@ class VByteProxy
 public:
     using MakeFilter = std::function<std::unique_ptr<IByteFilter>(unsigned connection)>;
 
-    /// @param port        to listen on, on all IPv4 interfaces; 0 takes any free one
-    /// @param host        where the host listens
-    /// @param makeFilter  called on the proxy's thread, with 1 for the first connection
+    /// Listens; devices that connect wait until Start.
+    ///
+    /// @param port  to listen on, on all IPv4 interfaces; 0 takes any free one
+    /// @param host  where the host listens
+    VByteProxy(std::uint16_t port, const sockaddr_in& host);
+
+    /// Listens and starts.
     VByteProxy(std::uint16_t port, const sockaddr_in& host, MakeFilter makeFilter);
 
     /// Closes everything.
@@ -57,6 +61,11 @@ public:
     VByteProxy(const VByteProxy&) = delete;
     VByteProxy& operator=(const VByteProxy&) = delete;
 
+    /// Begins to serve the devices; to be called once.
+    ///
+    /// @param makeFilter  called on the proxy's thread, with 1 for the first connection
+    void Start(MakeFilter makeFilter);
+
     std::uint16_t Port() const { return listeningPort; }
 
 private:
@@ -64,7 +73,8 @@ private:
 
     int stop = -1; // becomes readable to end the thread
     std::uint16_t listeningPort = 0;
-    std::thread thread;
+    std::shared_ptr<VLoop> loop;
+    std::thread thread; // runs the loop
 };
 
 /// Returns the address of a port of this machine's loopback interface.

@@ -1,5 +1,7 @@
 #include "korva-control/AwaitedSignals.h"
 
+#include <algorithm>
+#include <cerrno>
 #include <ctime>
 
 VAwaitedSignals::VAwaitedSignals()
@@ -22,8 +24,15 @@ void VAwaitedSignals::Await(std::optional<std::chrono::milliseconds> limit) cons
         sigwait(&signals, &number);
         return;
     }
-    timespec time{};
-    time.tv_sec = static_cast<std::time_t>(limit->count() / 1000);
-    time.tv_nsec = static_cast<long>(limit->count() % 1000) * 1000000;
-    sigtimedwait(&signals, nullptr, &time);
+    const auto end = std::chrono::steady_clock::now() + *limit;
+    int number = 0;
+    do {
+        const auto left = std::max(
+            std::chrono::ceil<std::chrono::milliseconds>(end - std::chrono::steady_clock::now()),
+            std::chrono::milliseconds::zero());
+        timespec time{};
+        time.tv_sec = static_cast<std::time_t>(left.count() / 1000);
+        time.tv_nsec = static_cast<long>(left.count() % 1000) * 1000000;
+        number = sigtimedwait(&signals, nullptr, &time);
+    } while (number < 0 && errno == EINTR); // a program that was suspended goes on waiting
 }

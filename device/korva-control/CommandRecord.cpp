@@ -8,6 +8,8 @@
 #include "ControlStreamClient/HostAddress.h"
 #include "FakeHost/ByteProxy.h"
 
+#include <system_error>
+
 #include <CLI/CLI.hpp>
 
 namespace {
@@ -44,18 +46,21 @@ public:
         session.Connect().GetServerInformation(); // there is a host at all
         session.Connect().Close();
 
-        VRecorder recorder(file, overwrite, session.Peer());
+        std::optional<VRecorder> recorder;
         Record(session, recorder, signals);
-        recorder.Finish();
+        recorder->Finish();
         return EExitCode::Done;
     }
 
 private:
-    void Record(VSession& session, VRecorder& recorder, const VAwaitedSignals& signals) const
+    /// @param recorder  is made once the port is taken, since a file must not suffer where it is
+    /// not
+    void Record(VSession& session, std::optional<VRecorder>& recorder,
+                const VAwaitedSignals& signals) const
     {
-        const FakeHost::VByteProxy proxy(
-            static_cast<std::uint16_t>(listen.value_or(0)), HostSocketAddress(session),
-            [&recorder](unsigned connection) { return recorder.MakeFilter(connection); });
+        FakeHost::VByteProxy proxy = TakePort(session);
+        recorder.emplace(file, overwrite, session.Peer());
+        proxy.Start([&recorder](unsigned connection) { return recorder->MakeFilter(connection); });
         std::unique_ptr<VAsyncClient> listener;
         if (listen) {
             PrintNotice("recording what devices and " + session.Peer() + " say, on port " +
@@ -66,6 +71,17 @@ private:
         }
         signals.Await(session.IsTimeLimitGiven() ? std::optional(session.TimeLimit())
                                                  : std::nullopt);
+    }
+
+    FakeHost::VByteProxy TakePort(VSession& session) const
+    {
+        const auto port = static_cast<std::uint16_t>(listen.value_or(0));
+        const sockaddr_in host = HostSocketAddress(session);
+        try {
+            return FakeHost::VByteProxy(port, host);
+        } catch (const std::system_error& error) {
+            throw VError(EErrorKind::NoConnection, error.what());
+        }
     }
 
     static std::unique_ptr<VAsyncClient> Listen(std::uint16_t port)

@@ -77,6 +77,16 @@ public:
 
     void Signal(int signal) const { kill(pid, signal); }
 
+    /// Stops the whole process as Ctrl-Z does, and lets it go on.
+    void SuspendForAMoment() const
+    {
+        kill(pid, SIGSTOP);
+        siginfo_t information{};
+        waitid(P_PID, static_cast<id_t>(pid), &information, WSTOPPED);
+        kill(pid, SIGCONT);
+        waitid(P_PID, static_cast<id_t>(pid), &information, WCONTINUED);
+    }
+
     /// Waits until an output that is not read takes no more.
     void WaitUntilOutputIsFull() const
     {

@@ -3,6 +3,11 @@
 #include "FakeHost/FakeHost.h"
 #include "FakeHost/SimulatedContent.h"
 #include "device/ClientSupport.h"
+#include "device/FullListener.h"
+#include "device/SocketFacts.h"
+
+#include <optional>
+#include <thread>
 
 #include <gmock/gmock.h>
 
@@ -226,6 +231,36 @@ TEST(FaultDelay, OnlyDelaysWhereTimeAllows)
     EXPECT_EQ(1, client.GetServerInformation().Major);
 
     EXPECT_GE(std::chrono::steady_clock::now() - start, 50ms);
+}
+
+TEST(ByteProxy, LetsDevicesWaitUntilItStarts)
+{
+    FakeHost::VFakeHost host(FakeHost::MakeSimulatedContent(2, {}), 0);
+    FakeHost::VByteProxy proxy(0, FakeHost::LoopbackAddress(host.Port()));
+    VClient client(WithLimit(Patient));
+    client.Connect("127.0.0.1", proxy.Port(), Patient);
+
+    proxy.Start([](unsigned connection) { return FakeHost::MakeFaultFilter({}, connection); });
+
+    EXPECT_EQ(1, client.GetServerInformation().Major);
+}
+
+TEST(ByteProxy, EndsAtOnceWhileTheHostTakesNoConnection)
+{
+    const VFullListener host(INADDR_LOOPBACK);
+    std::optional<FakeHost::VByteProxy> proxy(
+        std::in_place, 0, FakeHost::LoopbackAddress(host.Port()),
+        [](unsigned connection) { return FakeHost::MakeFaultFilter({}, connection); });
+    VClient client(WithLimit(Patient));
+    client.Connect("127.0.0.1", proxy->Port(), Patient);
+    while (!IsConnectingTo(host.Port())) {
+        std::this_thread::yield();
+    }
+
+    const auto start = std::chrono::steady_clock::now();
+    proxy.reset();
+
+    EXPECT_LT(std::chrono::steady_clock::now() - start, 3s);
 }
 
 TEST(FaultyHost, IsSoundBehindTheChosenConnections)

@@ -59,6 +59,8 @@ public:
 
     const std::string& Port() const { return port; }
 
+    void SuspendForAMoment() const { program.SuspendForAMoment(); }
+
     /// Ends it in order.
     VOutcome Stop()
     {
@@ -116,6 +118,16 @@ TEST(ProgramServe, SaysWhenThePortIsTaken)
     EXPECT_EQ(3, plain.ExitCode);
     EXPECT_THAT(plain.Errors, HasSubstr(reason));
     EXPECT_EQ(3, RunProgram({"serve", "--listen", host.Port(), "--never-reply"}).ExitCode);
+}
+
+TEST(ProgramServe, GoesOnAfterItWasSuspended)
+{
+    VServedHost host({"--timeout", "600"});
+
+    host.SuspendForAMoment();
+
+    EXPECT_EQ(0, RunProgram(At(host.Port(), {"info"})).ExitCode);
+    EXPECT_EQ(0, host.Stop().ExitCode);
 }
 
 struct VFaultSwitch
@@ -198,6 +210,36 @@ const VWrongUsage wrongUsages[] = {
 INSTANTIATE_TEST_SUITE_P(Table, ProgramToolsUsage, testing::ValuesIn(wrongUsages),
                          [](const auto& named) { return std::string(named.param.Name); });
 
+struct VNoNumber
+{
+    const char* Name;
+    std::vector<std::string> Command;
+    std::string Range;
+};
+
+class ProgramNoNumber : public testing::TestWithParam<VNoNumber>
+{
+};
+
+TEST_P(ProgramNoNumber, IsRefusedThoughItIsOutsideOfNoRange)
+{
+    const VOutcome outcome = RunProgram(GetParam().Command);
+
+    EXPECT_EQ(2, outcome.ExitCode);
+    EXPECT_THAT(outcome.Errors, HasSubstr("\"nan\" is no number from 0 to " + GetParam().Range));
+}
+
+// clang-format off
+const VNoNumber noNumbers[] = {
+    {"Speed", {"replay", "file", "--speed", "nan"}, "1000000;"},
+    {"Delay", {"serve", "--delay", "nan"}, "86400;"},
+    {"Thinking", {"serve", "--thinking", "nan"}, "86400;"},
+};
+// clang-format on
+
+INSTANTIATE_TEST_SUITE_P(Table, ProgramNoNumber, testing::ValuesIn(noNumbers),
+                         [](const auto& named) { return std::string(named.param.Name); });
+
 TEST(ProgramRecord, StandsBetweenADeviceAndItsHostAndBothCanBeReplayed)
 {
     const VTemporaryFolder folder;
@@ -269,6 +311,21 @@ TEST(ProgramRecord, TouchesNoFileThatIsThere)
     EXPECT_EQ(1, RunProgram({"--port", host.Port(), "--timeout", "0.2", "record", "/dev/full",
                              "--overwrite"})
                      .ExitCode);
+}
+
+TEST(ProgramRecord, LeavesTheFileAloneWhereItsPortIsTaken)
+{
+    const VTemporaryFolder folder;
+    const std::string file = folder.File("kept");
+    std::ofstream(file) << "precious";
+    VServedHost host;
+
+    const VOutcome refused =
+        RunProgram(At(host.Port(), {"record", file, "--overwrite", "--listen", host.Port()}));
+
+    EXPECT_EQ(3, refused.ExitCode);
+    EXPECT_THAT(refused.Errors, HasSubstr("the port cannot be taken"));
+    EXPECT_EQ("precious", ReadFile(file));
 }
 
 std::string RecordingOf(const std::string& request, const std::string& reply)

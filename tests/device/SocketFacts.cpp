@@ -4,6 +4,9 @@
 #include <linux/tcp.h>
 
 #include <cstddef>
+#include <cstdio>
+#include <fstream>
+#include <string>
 
 #include <netinet/in.h>
 #include <sys/socket.h>
@@ -30,4 +33,19 @@ int SocketTo(std::uint16_t port)
         }
     }
     return -1;
+}
+
+bool IsConnectingTo(std::uint16_t port)
+{
+    // Each line has the remote address in hexadecimal, its port behind a colon, and the state.
+    constexpr const char* connecting = "02";
+    char wanted[16];
+    std::snprintf(wanted, sizeof wanted, ":%04X %s ", static_cast<unsigned>(port), connecting);
+    std::ifstream table("/proc/self/net/tcp");
+    for (std::string line; std::getline(table, line);) {
+        if (line.find(wanted) != std::string::npos) {
+            return true;
+        }
+    }
+    return false;
 }
