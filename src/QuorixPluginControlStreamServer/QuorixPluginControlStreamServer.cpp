@@ -29,8 +29,8 @@ namespace {
 // Devices know this port; there is no setting for it.
 constexpr std::uint16_t controlStreamPort = 803;
 
-// Commands end at once, but a device that does not read its reply holds up the socket's thread. The
-// server frees that when it closes the connection.
+// Commands end at once, but a device that does not read its reply holds up the socket's thread for
+// as long as it likes.
 constexpr std::chrono::milliseconds commandPatience{2000};
 
 } // namespace
@@ -41,11 +41,21 @@ VQuorixPluginControlStreamServer::~VQuorixPluginControlStreamServer()
 {
     // A command or a check that is running holds the authorization, whose end would then come with
     // theirs: too late to reach the devices, once the server has gone.
-    if (socket) {
-        (void)socket->AwaitThread(commandPatience);
-    }
+    const bool idle = socket && socket->AwaitThread(commandPatience);
     if (authorization) {
         authorization->EndHeartbeatCheck();
+    }
+
+    authorizationGUI.reset();
+    authorization.reset();
+    controlSystem.reset();
+    eventProviders.clear();
+    commandProviders.clear();
+    server.reset();
+    // A message that has come since holds the server, which holds the socket: the port would stay
+    // taken for a moment, and a host that starts the plug-in again would find nobody listening.
+    if (idle) {
+        (void)socket->AwaitThread(commandPatience);
     }
 }
 

@@ -115,6 +115,7 @@ protected:
     {
         plugin->Stop();
         library.Destroy(plugin);
+        EXPECT_FALSE(PluginBench::CanConnect()); // the next one is to have the port
     }
 
     /// A device that the server has on its list.
