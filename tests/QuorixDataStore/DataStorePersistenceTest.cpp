@@ -151,6 +151,30 @@ TEST_F(DataStorePersistenceTest, CopyAllCarriesFlagsAndBothValues)
     EXPECT_THAT(Logged(), IsEmpty());
 }
 
+TEST_F(DataStorePersistenceTest, CopyAllAsksNoProposedValueOfAnItemWithoutTheFlag)
+{
+    Put(source, "A", ReadOnly, Byte(1));
+    Put(target, "A", VerifyRequired, VDataValue(), Byte(9));
+
+    EXPECT_EQ(Copy("A", CopyAll), EDataCopyResult::CopyDone);
+
+    EXPECT_EQ(Get(target, "A").Flags, ReadOnly);
+    EXPECT_EQ(Get(target, "A").Verified, Byte(1));
+    EXPECT_THAT(Logged(), IsEmpty());
+}
+
+TEST_F(DataStorePersistenceTest, CopyAllCarriesAProposedValueAlone)
+{
+    Put(source, "A", VerifyRequired, VDataValue(), Byte(2));
+
+    EXPECT_EQ(Copy("A", CopyAll), EDataCopyResult::CopyDone);
+
+    EXPECT_EQ(Get(target, "A").Flags, VerifyRequired);
+    EXPECT_EQ(Get(target, "A").Proposed, Byte(2));
+    EXPECT_TRUE(Get(target, "A").Verified.Empty());
+    EXPECT_THAT(Logged(), ElementsAre("6: Could not read 'A' verified value."));
+}
+
 TEST_F(DataStorePersistenceTest, CopyAllSkipsFlagsWithoutAValue)
 {
     Put(source, "A", VerifyRequired, VDataValue());
@@ -204,6 +228,21 @@ TEST_F(DataStorePersistenceTest, FlagsThatCannotBeReadCountAsNone)
     }
 
     EXPECT_EQ(Get(target, "A").Verified, Byte(1));
+}
+
+TEST_F(DataStorePersistenceTest, FlagsOfTheTargetThatCannotBeReadCountAsNone)
+{
+    Put(source, "A", VerifyRequired, VDataValue(), Byte(2));
+    {
+        const VDataVerifyReader reader(source);
+        VFlaglessWriter writer(target);
+
+        EXPECT_EQ(DataStorePersistence::CopyValue(Token("A"), reader, writer, 0),
+                  EDataCopyResult::CopyDone);
+    }
+
+    EXPECT_EQ(Get(target, "A").Flags, VerifyRequired);
+    EXPECT_EQ(Get(target, "A").Proposed, Byte(2));
 }
 
 struct VRefusal

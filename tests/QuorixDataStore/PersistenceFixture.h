@@ -43,11 +43,12 @@ private:
     const std::set<std::string> refused;
 };
 
-/// A source that cannot tell an item's flags.
-class VFlaglessReader : public VDataVerifyReader
+/// A view that cannot tell an item's flags.
+template <typename View>
+class VFlagless : public View
 {
 public:
-    using VDataVerifyReader::VDataVerifyReader;
+    using View::View;
 
     bool GetFlags(const VDataToken&, std::uint32_t& flags) const override
     {
@@ -55,6 +56,9 @@ public:
         return false;
     }
 };
+
+using VFlaglessReader = VFlagless<VDataVerifyReader>;
+using VFlaglessWriter = VFlagless<VDataVerifyWriter>;
 
 /// One item as a store holds it.
 struct VItem
