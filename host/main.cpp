@@ -4,12 +4,14 @@
 #include "Options.h"
 #include "QuorixVersion.h"
 #include "utils/LogStatement.h"
+#include "window/DisplayCheck.h"
 #include "window/HostWindow.h"
 #include "window/WindowLog.h"
 
 #include <QApplication>
 #include <QQuickWindow>
 
+#include <chrono>
 #include <csignal>
 #include <exception>
 #include <iostream>
@@ -18,13 +20,8 @@ namespace {
 
 constexpr int noDisplayExitCode = 1;
 
-/// Tells whether a window could come up. Qt would end the process without a display.
-bool HasDisplay()
-{
-    return qEnvironmentVariableIsSet("QT_QPA_PLATFORM") ||
-           !qEnvironmentVariableIsEmpty("DISPLAY") ||
-           !qEnvironmentVariableIsEmpty("WAYLAND_DISPLAY");
-}
+// How long a display may take to answer before it counts as none.
+constexpr std::chrono::seconds displayPatience{10};
 
 /// Has Qt's own threads leave the signals to the thread that waits for them.
 void BlockStopSignals()
@@ -57,8 +54,10 @@ int RunWithoutWindow(const QuorixHost::VOptions& options, int& argumentCount, ch
 
 int RunWithWindow(const QuorixHost::VOptions& options, int& argumentCount, char** arguments)
 {
-    if (!HasDisplay()) {
-        KVR_LOG("Host", 2, "There is no display for a window. Run with --headless to do without");
+    if (const auto reason = QuorixHost::DescribeMissingDisplay(displayPatience)) {
+        KVR_LOG("Host", 2,
+                "There is no display for a window: %1%. Run with --headless to do without",
+                *reason);
         return noDisplayExitCode;
     }
     BlockStopSignals();

@@ -177,6 +177,16 @@ TEST(HostOptions, WithoutADisplayAWindowEndsWith1)
     EXPECT_THAT(host.Errors(), HasSubstr("--headless"));
 }
 
+TEST(HostOptions, WithADeadDisplayAWindowEndsWith1)
+{
+    VHostProcess host({"--console"}, {"env", "-u", "QT_QPA_PLATFORM", "DISPLAY=:7777"});
+
+    EXPECT_EQ(1, host.WaitExit().value_or(-1));
+
+    EXPECT_THAT(host.Errors(), HasSubstr("There is no display for a window"));
+    EXPECT_THAT(host.Errors(), HasSubstr(":7777"));
+}
+
 TEST(HostOptions, AMissingPluginEndsWith1)
 {
     VHostProcess host({"--headless", "--console", "--plugin", "/no/such/plugin.so"});
