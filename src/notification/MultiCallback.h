@@ -4,7 +4,10 @@
 #include "notification/IMultiCallback.h"
 #include "utils/Mutex.h"
 
+#include <boost/container/small_vector.hpp>
+
 #include <algorithm>
+#include <atomic>
 #include <cstdint>
 #include <memory>
 #include <utility>
@@ -53,7 +56,10 @@ public:
     /// Calls every function. @return whether at least one of them had a live target
     bool operator()(Args... arguments)
     {
-        const std::vector<VEntry> called = Entries(); // keeps the handles of removed ones unused
+        if (count.load(std::memory_order_acquire) == 0) {
+            return false; // most lists of most objects are empty: that costs no lock
+        }
+        const VSnapshot called = Entries(); // keeps the handles of removed ones unused
         std::vector<std::uint64_t> dead;
         for (const VEntry& entry : called) {
             if (!KVR::GuardedCall(*entry, arguments...)) {
@@ -71,16 +77,17 @@ private:
 
     typedef boost::function<Sig> VStored;
     typedef std::shared_ptr<VStored> VEntry;
+    typedef boost::container::small_vector<VEntry, 4> VSnapshot; // most lists are short
 
     static std::uint64_t HandleOf(const VEntry& entry)
     {
         return reinterpret_cast<std::uintptr_t>(entry.get());
     }
 
-    std::vector<VEntry> Entries() const
+    VSnapshot Entries() const
     {
         KVR::VMutexLock lock(mutex);
-        return entries;
+        return VSnapshot(entries.begin(), entries.end());
     }
 
     std::uint64_t Append(VEntry entry)
@@ -88,6 +95,7 @@ private:
         const std::uint64_t handle = HandleOf(entry);
         KVR::VMutexLock lock(mutex);
         entries.push_back(std::move(entry));
+        count.store(entries.size(), std::memory_order_release);
         return handle;
     }
 
@@ -103,6 +111,7 @@ private:
         }
         VEntry taken = std::move(*found);
         entries.erase(found);
+        count.store(entries.size(), std::memory_order_release);
         return taken;
     }
 
@@ -110,11 +119,13 @@ private:
     std::vector<VEntry> TakeAll()
     {
         KVR::VMutexLock lock(mutex);
+        count.store(0, std::memory_order_release);
         return std::exchange(entries, {});
     }
 
     mutable KVR::VMutex mutex;
     std::vector<VEntry> entries KVR_GUARDED_BY(mutex); // in order of adding
+    std::atomic<std::size_t> count{0};                 // of entries; written with the mutex held
 };
 
 } // namespace NotificationSystem
