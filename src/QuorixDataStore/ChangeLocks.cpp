@@ -34,7 +34,8 @@ bool VChangeLocks::AddWriter(std::uint64_t thread, std::uint64_t currentChangeId
         changeId = currentChangeId;
         return true;
     }
-    VThreadLocks& locks = FindOrMakeThread(thread);
+    threads.push_back({thread, 0, 0, 0});
+    VThreadLocks& locks = threads.back();
     if (entries.empty()) {
         entries.push_back({currentChangeId, 0, 0});
     } else if (entries.back().Writer != 0) {

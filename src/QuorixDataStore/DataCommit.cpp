@@ -50,6 +50,9 @@ NotificationSystem::VMultiCallback<void()>& Callback(VDataListeners& listeners,
 
 void VDataFirings::Sort()
 {
+    if (firings.size() < 2) {
+        return;
+    }
     std::sort(firings.begin(), firings.end(), [](const VFiring& left, const VFiring& right) {
         return left.Kind != right.Kind
                    ? left.Kind < right.Kind
@@ -68,18 +71,20 @@ void VDataFirings::Fire() const noexcept
         CallListeners(Callback(*firing.Listeners, firing.Kind));
         fired.push_back(firing.Listeners);
     }
-    std::sort(fired.begin(), fired.end(), std::less<VDataListeners*>());
-    fired.erase(std::unique(fired.begin(), fired.end()), fired.end());
+    if (fired.size() > 1) {
+        std::sort(fired.begin(), fired.end(), std::less<VDataListeners*>());
+        fired.erase(std::unique(fired.begin(), fired.end()), fired.end());
+    }
     for (VDataListeners* listeners : fired) {
         CallListeners(listeners->OnAnyChange);
     }
 }
 
-VDataFirings VDataCommit::Run(DataStoreDelta& delta)
+void VDataCommit::Run(DataStoreDelta& delta)
 {
     committed.AdvanceChangeId(); // for no change too: the id counts write locks
     if (delta.Empty()) {
-        return std::move(firings);
+        return;
     }
     delta.Consume([&](VDataItemDelta& record, const VDataPath& path, VDataNode* node) {
         CollectForRecord(record, path);
@@ -97,7 +102,6 @@ VDataFirings VDataCommit::Run(DataStoreDelta& delta)
         }
     }
     firings.Sort();
-    return std::move(firings);
 }
 
 void VDataCommit::Fold(VDataItemDelta& record, const VDataPath& path, VDataNode* node)

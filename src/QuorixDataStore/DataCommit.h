@@ -44,14 +44,17 @@ class VDataCommit
 {
 public:
     /// @param unverified  the paths whose proposed values await verification, kept up to date
-    VDataCommit(VCommittedData& tree, const VListenerTree& listeners,
-                std::unordered_set<VDataPath>& unverified)
+    VDataCommit(VCommittedData& tree, VListenerTree& listeners,
+                std::unordered_set<VDataPath, VDataPathQuickHash>& unverified)
         : committed(tree), listenerTree(listeners), pendingPaths(unverified)
     {
     }
 
-    /// Counts the change id up and leaves the delta empty. @return what to fire
-    VDataFirings Run(DataStoreDelta& delta);
+    /// Counts the change id up and leaves the delta empty.
+    void Run(DataStoreDelta& delta);
+
+    /// Returns what to fire once the mutex is released.
+    const VDataFirings& Firings() const { return firings; }
 
 private:
     void Fold(VDataItemDelta& record, const VDataPath& path, VDataNode* node);
@@ -61,8 +64,8 @@ private:
     void Collect(const VDataPath& path, VDataFirings::EKind kind);
 
     VCommittedData& committed;
-    const VListenerTree& listenerTree;
-    std::unordered_set<VDataPath>& pendingPaths;
+    VListenerTree& listenerTree;
+    std::unordered_set<VDataPath, VDataPathQuickHash>& pendingPaths;
     VDataFirings firings;
     VDataListenersList collected; // for one path at a time
 };

@@ -255,6 +255,21 @@ std::uint64_t VDataPath::Hash() const
     return result;
 }
 
+std::size_t VDataPath::QuickHash() const
+{
+    constexpr std::uint64_t mixing = 0x9E3779B97F4A7C15; // odd, with its ones spread out
+    const std::size_t size = TextSize();
+    const char* const text = block == nullptr ? nullptr : block->Text();
+    std::uint64_t hash = size;
+    for (std::size_t position = 0; position < size; position += sizeof hash) {
+        std::uint64_t word = 0;
+        std::memcpy(&word, text + position, std::min(sizeof word, size - position));
+        hash = (hash ^ word) * mixing;
+        hash ^= hash >> 32;
+    }
+    return static_cast<std::size_t>(hash);
+}
+
 void VDataPath::ShrinkToFit()
 {
     if (block == nullptr || (block->ComponentCapacity == block->Count &&

@@ -122,6 +122,10 @@ public:
     /// Returns the hash for unordered containers; equal paths have equal ones.
     std::uint64_t Hash() const;
 
+    /// Returns another hash, of the text, for tables that need no particular one: it takes a
+    /// fraction of the time, and may differ between two builds.
+    std::size_t QuickHash() const;
+
     /// True if both share one block of text: a quick proof of equality, while false proves nothing.
     bool SharesText(const VDataPath& other) const { return block == other.block; }
 
@@ -183,3 +187,9 @@ struct hash<VDataPath>
 };
 
 } // namespace std
+
+/// The quick hash, for tables of paths.
+struct VDataPathQuickHash
+{
+    std::size_t operator()(const VDataPath& path) const { return path.QuickHash(); }
+};

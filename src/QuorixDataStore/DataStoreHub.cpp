@@ -108,14 +108,15 @@ void VDataStoreHub::Release(bool (VChangeLocks::*remove)(std::uint64_t))
     if (!(changeLocks.*remove)(thread)) {
         return;
     }
-    const VDataFirings firings = VDataCommit(committed, listenerTree, pendingPaths).Run(delta);
+    VDataCommit commit(committed, listenerTree, pendingPaths);
+    commit.Run(delta);
     activeWriter.store(changeLocks.ActiveWriter(), std::memory_order_relaxed);
     std::shared_ptr<const KVR::VShared> self;
-    if (!firings.Empty()) {
+    if (!commit.Firings().Empty()) {
         self = shared_from_this(); // a listener may let go of the store
     }
     lock.Unlock();
 
     changeSignal.notify_all();
-    firings.Fire();
+    commit.Firings().Fire();
 }

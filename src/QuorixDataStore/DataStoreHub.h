@@ -79,5 +79,5 @@ private:
     const DataStoreDelta& noChanges; // always empty: what everybody but the writer has pending
 
     VListenerTree listenerTree KVR_GUARDED_BY(stateMutex);
-    std::unordered_set<VDataPath> pendingPaths KVR_GUARDED_BY(stateMutex);
+    std::unordered_set<VDataPath, VDataPathQuickHash> pendingPaths KVR_GUARDED_BY(stateMutex);
 };

@@ -15,6 +15,34 @@ void Add(const VDataListenerNode& node, VDataListenersList& listeners)
 
 VDataListeners& VListenerTree::FindOrMake(const VDataPath& path)
 {
+    return path.HasWildcard() ? FindOrMakeWildcard(path) : named[path];
+}
+
+const VDataListeners* VListenerTree::Find(const VDataPath& path) const
+{
+    if (path.HasWildcard()) {
+        return FindWildcard(path);
+    }
+    const auto found = named.find(path);
+    return found == named.end() ? nullptr : &found->second;
+}
+
+void VListenerTree::Collect(const VDataPath& path, VDataListenersList& listeners)
+{
+    if (path.Empty() || path.HasWildcard()) {
+        return;
+    }
+    const auto found = named.find(path);
+    if (found != named.end()) {
+        listeners.push_back(&found->second);
+    }
+    if (hasWildcards) {
+        CollectFrom(root, path, 0, listeners);
+    }
+}
+
+VDataListeners& VListenerTree::FindOrMakeWildcard(const VDataPath& path)
+{
     VDataListenerNode* node = &root;
     for (std::size_t index = 0; index < path.Count(); ++index) {
         const std::string_view name = path.Component(index);
@@ -27,12 +55,12 @@ VDataListeners& VListenerTree::FindOrMake(const VDataPath& path)
     }
     if (!node->Listeners) {
         node->Listeners = std::make_unique<VDataListeners>();
-        empty = false;
+        hasWildcards = true;
     }
     return *node->Listeners;
 }
 
-const VDataListeners* VListenerTree::Find(const VDataPath& path) const
+const VDataListeners* VListenerTree::FindWildcard(const VDataPath& path) const
 {
     const VDataListenerNode* node = &root;
     for (std::size_t index = 0; index < path.Count() && node != nullptr; ++index) {
@@ -45,13 +73,6 @@ const VDataListeners* VListenerTree::Find(const VDataPath& path) const
         }
     }
     return node == nullptr ? nullptr : node->Listeners.get();
-}
-
-void VListenerTree::Collect(const VDataPath& path, VDataListenersList& listeners) const
-{
-    if (!path.Empty() && !path.HasWildcard()) {
-        CollectFrom(root, path, 0, listeners);
-    }
 }
 
 void VListenerTree::CollectFrom(const VDataListenerNode& from, const VDataPath& path,

@@ -9,8 +9,9 @@
 #include <map>
 #include <memory>
 #include <string>
+#include <unordered_map>
 
-/// One node of the tree of listener paths. A "*" of a path leads to the wildcard child.
+/// One node of the tree of listener paths with wildcards. A "*" leads to the wildcard child.
 struct VDataListenerNode
 {
     std::map<std::string, std::unique_ptr<VDataListenerNode>, std::less<>> Children;
@@ -24,6 +25,7 @@ using VDataListenersList = boost::container::small_vector<VDataListeners*, 8>;
 /// The listeners of every path that somebody asked for. Nothing is ever removed, so that each
 /// record stays at its address.
 ///
+/// Most listeners name one item, and a commit finds these without a walk through the tree.
 /// Owns: nodes and records. Threads: guarded by its owner.
 class VListenerTree
 {
@@ -36,15 +38,19 @@ public:
 
     /// Appends the records that hear of a path, some perhaps twice. An empty path, or one with a
     /// wildcard, is nobody's.
-    void Collect(const VDataPath& path, VDataListenersList& listeners) const;
+    void Collect(const VDataPath& path, VDataListenersList& listeners);
 
     /// True until the first record is made: then nobody needs to collect.
-    bool Empty() const { return empty; }
+    bool Empty() const { return named.empty() && !hasWildcards; }
 
 private:
+    VDataListeners& FindOrMakeWildcard(const VDataPath& path);
+    const VDataListeners* FindWildcard(const VDataPath& path) const;
     static void CollectFrom(const VDataListenerNode& node, const VDataPath& path, std::size_t index,
                             VDataListenersList& listeners);
 
-    VDataListenerNode root;
-    bool empty = true;
+    std::unordered_map<VDataPath, VDataListeners, VDataPathQuickHash>
+        named;              // those without a wildcard
+    VDataListenerNode root; // of those with one
+    bool hasWildcards = false;
 };

@@ -246,6 +246,21 @@ TEST(DataPath, OrdersByBytesAndPrefixesFirst)
     }
 }
 
+TEST(DataPath, HasAQuickHashOfItsTextAlone)
+{
+    VDataPath appended("A.Long");
+    appended.Append("Component"); // with room to spare, and a block of its own
+
+    EXPECT_EQ(VDataPath("A.Long.Component").QuickHash(), appended.QuickHash());
+    EXPECT_EQ(0u, VDataPath().QuickHash());
+    std::set<std::size_t> hashes;
+    for (int camera = 0; camera < 1000; ++camera) {
+        hashes.insert(VDataPath("Device.qx:" + std::to_string(camera) + ".Settings.StrobeIntensity")
+                          .QuickHash());
+    }
+    EXPECT_EQ(1000u, hashes.size());
+}
+
 TEST(DataPath, HashFoldsSignedBytesAndThenComponents)
 {
     EXPECT_EQ(0u, VDataPath().Hash());
