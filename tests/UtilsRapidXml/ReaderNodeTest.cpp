@@ -2,6 +2,7 @@
 
 #include "UtilsRapidXml/Loading.h"
 #include "UtilsRapidXml/ParseXml.h"
+#include "support/VirtualSlot.h"
 
 #include <gmock/gmock.h>
 
@@ -11,8 +12,23 @@ using namespace Loading;
 using namespace UtilsRapidXml;
 using testing::ElementsAre;
 using testing::IsEmpty;
+using TestSupport::SlotOf;
 
 namespace {
+
+TEST(ReaderNode, SlotsAreInOrder)
+{
+    EXPECT_EQ(0U, SlotOf(&INode::GetName));
+    EXPECT_EQ(1U, SlotOf(&INode::SetVersion));
+    EXPECT_EQ(2U, SlotOf(&INode::GetVersion));
+    EXPECT_EQ(3U, SlotOf(&INode::WriterHook));
+    EXPECT_EQ(4U, SlotOf(&INode::AddChildElement));
+    EXPECT_EQ(5U, SlotOf(&INode::ProcessChildren));
+    EXPECT_EQ(6U, SlotOf(&INode::ReadAttribute));
+    EXPECT_EQ(7U, SlotOf(&INode::AddError));
+    EXPECT_EQ(8U, SlotOf(&INode::AddWarning));
+    EXPECT_EQ(9U, SlotOf(&INode::GetErrorCount));
+}
 
 TEST(ReaderNode, DeliversAttributesByExactName)
 {

@@ -1,6 +1,8 @@
 #include "io/InputStreamAdapter.h"
 
+#include "io/IReader.h"
 #include "io/SchemaSamples.h"
+#include "support/VirtualSlot.h"
 
 #include <gtest/gtest.h>
 
@@ -34,6 +36,18 @@ private:
 };
 
 } // namespace
+
+TEST(InputStream, SlotsAreInOrder)
+{
+    using TestSupport::destructorSlots;
+    using TestSupport::SlotOf;
+
+    EXPECT_EQ(destructorSlots + 0, SlotOf(&IInputStream::Read));
+    EXPECT_EQ(destructorSlots + 1, SlotOf(&IInputStream::IsPastEnd));
+    EXPECT_EQ(destructorSlots + 2, SlotOf(&IInputStream::ReadParts));
+    EXPECT_EQ(destructorSlots + 3, SlotOf(&IInputStream::IsSeekable));
+    EXPECT_EQ(0u, SlotOf(&KVR::IReader::Read)); // in front of its destructor
+}
 
 TEST(InputStream, GatheredReadCallsReadForEachPartInOrder)
 {

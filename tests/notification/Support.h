@@ -2,6 +2,7 @@
 
 #include "notification/GuardedCall.h"
 #include "notification/IPostalService.h"
+#include "support/VirtualSlot.h"
 
 #include <boost/function.hpp>
 #include <gtest/gtest.h>
@@ -9,7 +10,6 @@
 #include <chrono>
 #include <condition_variable>
 #include <cstdint>
-#include <cstring>
 #include <deque>
 #include <functional>
 #include <memory>
@@ -119,18 +119,7 @@ inline void PostAndWait(KVR::IPostalService& service)
     ASSERT_TRUE(reached.Wait());
 }
 
-/// Returns the place of a virtual operation in its table. A pointer to such an operation holds one
-/// more than the operation's offset there.
-template <typename Operation>
-std::size_t SlotOf(Operation operation)
-{
-    std::uintptr_t representation = 0;
-    static_assert(sizeof operation >= sizeof representation, "of the common C++ ABI");
-    std::memcpy(&representation, &operation, sizeof representation);
-    return (representation - 1) / sizeof(void*);
-}
-
-/// The two table entries of a virtual destructor.
-constexpr std::size_t destructorSlots = 2;
+using TestSupport::destructorSlots;
+using TestSupport::SlotOf;
 
 } // namespace NotificationTest
