@@ -328,6 +328,30 @@ TEST(ReadConfiguration, AValueOfAnotherTypeIsLeftOutWithoutAMessage)
     EXPECT_EQ(VDataVerifyReader(store).GetValue(Token("A.B")), Word(1));
 }
 
+TEST(ReadConfiguration, TheDataPathsOfOneFileHaveAGreatestSizeTogether)
+{
+    constexpr std::size_t size = std::size_t(16) << 20; // of the text of each path
+    constexpr std::size_t most = DataStoreFileFormat::GreatestPathText / size;
+    const std::string item = "<Item name='x' format='{\"Type\":\"UInt8\"}' value-verified='7'/>";
+    std::string nodes[2];
+    for (std::size_t each = 0; each < most; ++each) {
+        nodes[each % 2] += item;
+    }
+    std::string content;
+    for (const std::string& items : nodes) {
+        content += "<Node name='" + std::string(size - 2, 'n') + "'>" + items + "</Node>";
+    }
+    VDataStore store;
+
+    const std::optional<VReadFile> good = ReadInto(store, Configuration(content));
+    const std::optional<VReadFile> cut =
+        ReadInto(store, Configuration(content + "<Node name='A'>" + item + "</Node>"));
+
+    EXPECT_THAT(good->Errors, IsEmpty());
+    EXPECT_THAT(cut->Errors, ElementsAre("Encountered 'Item' beyond the greatest size of all data "
+                                         "paths together."));
+}
+
 TEST(ReadConfiguration, LooseXmlIsTaken)
 {
     VDataStore store;
