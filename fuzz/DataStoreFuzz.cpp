@@ -41,7 +41,7 @@ VStoreStep StepOf(const std::uint8_t* bytes)
     step.Value.Number = bytes[2] / 16 % 3;
     step.Target = bytes[3] % 4 == 0 ? 7 : bytes[3] % 4;
     step.Flags = bytes[3] / 4 % 8;
-    step.KeptToken = bytes[3] / 32 % 2 == 1;
+    step.Token = bytes[3] / 32 % 2 == 1 ? VStoreStep::Kept : VStoreStep::New;
     return step;
 }
 
@@ -49,7 +49,7 @@ VStoreStep StepOf(const std::uint8_t* bytes)
 class VPair
 {
 public:
-    VPair() : reference(HistoryListeners()), performer(store)
+    VPair() : reference(HistoryListeners()), performer(store, shared)
     {
         VFiringRecorder().ListenTo(store);
         reference.Commit(); // of the scope that made the listeners
@@ -85,6 +85,7 @@ private:
 
     VDataStore store;
     VReferenceStore reference;
+    VSharedTokens shared;
     VStepPerformer performer;
 };
 

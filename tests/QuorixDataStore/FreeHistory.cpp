@@ -24,8 +24,13 @@ struct VScope
 class VFreeThread
 {
 public:
-    VFreeThread(VDataStore& store, int thread, std::uint32_t seed, int scopeCount)
-        : store(store), thread(thread), random(seed), performer(store), scopeCount(scopeCount)
+    VFreeThread(VDataStore& store, const VSharedTokens& shared, int thread, std::uint32_t seed,
+                int scopeCount)
+        : store(store),
+          thread(thread),
+          random(seed),
+          performer(store, shared),
+          scopeCount(scopeCount)
     {
     }
 
@@ -192,13 +197,14 @@ std::string PlayFreeHistory(std::uint32_t seed, int threadCount, int scopes)
 {
     VDataStore store;
     VFiringRecorder().ListenTo(store);
+    const VSharedTokens shared;
     std::vector<std::unique_ptr<VFreeThread>> runs;
     {
         const VWatchdog watchdog(store, "free history of seed " + std::to_string(seed));
         std::vector<std::thread> threads;
         for (int index = 0; index < threadCount; ++index) {
             runs.push_back(std::make_unique<VFreeThread>(
-                store, index, seed * 100 + static_cast<std::uint32_t>(index), scopes));
+                store, shared, index, seed * 100 + static_cast<std::uint32_t>(index), scopes));
             threads.emplace_back([run = runs.back().get()] { run->Run(); });
         }
         for (std::thread& thread : threads) {

@@ -68,9 +68,10 @@ std::string VStoreStep::Text() const
                                         "RemoveAll",
                                         "RemoveAllRestorable",
                                         "SetFlags"};
+    static const char* const tokens[] = {"", " kept", " shared"};
     return std::string(kinds[Kind]) + "(" + Join(Path) + ") name=" + Name +
            " value=" + ValueText(Value) + " target=" + std::to_string(Target) +
-           " flags=" + std::to_string(Flags) + (KeptToken ? " kept" : "");
+           " flags=" + std::to_string(Flags) + tokens[Token] + (Elsewhere ? " elsewhere" : "");
 }
 
 std::string VReferenceStore::Perform(const VStoreStep& step, bool isWriter)

@@ -54,13 +54,21 @@ struct VStoreStep
         KindCount
     };
 
+    /// Which token the step uses.
+    enum EToken {
+        New,
+        Kept,  ///< one that this thread used before
+        Shared ///< one that all threads use
+    };
+
     EKind Kind = GetCurrentChangeId;
     Names Path;
     std::string Name;
     VReferenceValue Value;
     std::uint32_t Target = 3;
     std::uint32_t Flags = 0;
-    bool KeptToken = false; ///< use a token that was used before, instead of a new one
+    EToken Token = New;
+    bool Elsewhere = false; ///< the token is used on another store first
 
     std::string Text() const;
 };

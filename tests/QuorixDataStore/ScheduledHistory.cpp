@@ -91,7 +91,7 @@ public:
         recorder.ListenTo(store);
         reference.Commit(); // of the scope that made the listeners
         for (std::size_t thread = 0; thread < threadCount; ++thread) {
-            performers.emplace_back(store);
+            performers.emplace_back(store, shared);
             workers.push_back(std::make_unique<VWorkerThread>());
         }
     }
@@ -112,7 +112,11 @@ public:
         if (difference.empty() && !store.GetLocks().empty()) {
             difference = "locks are left:\n" + LocksText(store);
         }
-        return difference.empty() ? "" : difference + "\nafter:\n" + story;
+        if (difference.empty()) {
+            return "";
+        }
+        LetGo();
+        return difference + "\nafter:\n" + story;
     }
 
 private:
@@ -239,6 +243,35 @@ private:
         story += "  thread " + std::to_string(thread) + " " + what + " -> " + result + "\n";
     }
 
+    /// Releases whatever the threads hold, so that those that wait come to an end, after a
+    /// difference of which nothing is sure but that a release without a lock does nothing.
+    void LetGo()
+    {
+        const bool done = Eventually([this] {
+            bool allDone = true;
+            for (const std::unique_ptr<VWorkerThread>& worker : workers) {
+                allDone = allDone && !worker->Busy();
+                if (!worker->Busy()) {
+                    worker->Start([this] { ReleaseAll(); });
+                    static_cast<void>(worker->Finish());
+                }
+            }
+            return allDone;
+        });
+        if (!done) {
+            std::fprintf(stderr, "%s\nafter:\n%s", difference.c_str(), story.c_str());
+            std::abort(); // a thread that waits for ever still uses this object
+        }
+    }
+
+    void ReleaseAll()
+    {
+        for (int depth = 0; depth < 3; ++depth) {
+            store.ReleaseReadLock();
+            store.ReleaseWriteLock();
+        }
+    }
+
     bool Held() const
     {
         for (std::size_t thread = 0; thread < threadCount; ++thread) {
@@ -264,6 +297,7 @@ private:
     VFiringRecorder recorder;
     VReferenceStore reference;
     VReferenceLocks locks;
+    VSharedTokens shared;
     std::vector<VStepPerformer> performers;
     std::vector<bool> blocked;
     std::string results[threadCount];

@@ -7,6 +7,8 @@
 #include <condition_variable>
 #include <cstdio>
 #include <cstdlib>
+#include <memory>
+#include <stdexcept>
 #include <thread>
 
 namespace StoreTest {
@@ -84,6 +86,26 @@ Names RandomPath(std::mt19937& random, bool wildcards)
     return path;
 }
 
+/// Returns a store that no history is about, in which other items have the numbers.
+const VDataStore& Elsewhere()
+{
+    static const std::unique_ptr<VDataStore> store = [] {
+        auto made = std::make_unique<VDataStore>();
+        VDataWriter writer(*made);
+        for (const char* path : {"C.C", "B", "C", "A.B", "B.A.C", "C.A"}) {
+            EXPECT_TRUE(writer.SetValue(Token(path), Byte(77)));
+        }
+        return made;
+    }();
+    return *store;
+}
+
+/// A listener that fails: nobody else may notice.
+void Throw()
+{
+    throw std::runtime_error("a listener of a history");
+}
+
 std::vector<std::string>& FiringsOfThisThread()
 {
     static thread_local std::vector<std::string> firings;
@@ -131,16 +153,50 @@ VStoreStep RandomStep(std::mt19937& random, bool writing)
     step.Value.Number = static_cast<int>(random() % 3);
     step.Target = random() % 12 == 0 ? 7 : 1 + random() % 3;
     step.Flags = random() % 4;
-    step.KeptToken = random() % 2 == 0;
+    step.Token = static_cast<VStoreStep::EToken>(random() % 3);
+    step.Elsewhere = random() % 4 == 0;
     return step;
+}
+
+VSharedTokens::VSharedTokens()
+{
+    std::vector<Names> parents{Names()};
+    for (int depth = 0; depth < 3; ++depth) {
+        std::vector<Names> children;
+        for (const Names& parent : parents) {
+            for (const char* name : {"A", "B", "C"}) {
+                children.push_back(parent);
+                children.back().emplace_back(name);
+                tokens.emplace(children.back(), VDataToken(RealPath(children.back())));
+            }
+        }
+        parents = std::move(children);
+    }
+}
+
+const VDataToken* VSharedTokens::Find(const Names& path) const
+{
+    const auto found = tokens.find(path);
+    return found == tokens.end() ? nullptr : &found->second;
+}
+
+const VDataToken& VStepPerformer::TokenOf(const VStoreStep& step, const VDataToken& fresh)
+{
+    if (step.Token == VStoreStep::Kept) {
+        return kept.emplace(step.Path, fresh).first->second;
+    }
+    const VDataToken* common = step.Token == VStoreStep::Shared ? shared.Find(step.Path) : nullptr;
+    return common != nullptr ? *common : fresh;
 }
 
 std::string VStepPerformer::Perform(const VStoreStep& step)
 {
     const VDataPath path = RealPath(step.Path);
     const VDataToken fresh(path);
-    const VDataToken& token =
-        step.KeptToken ? kept.emplace(step.Path, VDataToken(path)).first->second : fresh;
+    const VDataToken& token = TokenOf(step, fresh);
+    if (step.Elsewhere) {
+        static_cast<void>(VDataReader(Elsewhere()).HasValue(token)); // leaves its numbers there
+    }
     const auto target = static_cast<EDataValueTarget>(step.Target);
     std::string text;
     switch (step.Kind) {
@@ -217,6 +273,7 @@ void VFiringRecorder::ListenTo(VDataStore& store)
 {
     std::uint64_t changeId = 0;
     store.AcquireWriteLock(changeId);
+    bool throws = false;
     for (const Names& path : HistoryListeners()) {
         VDataListeners& listeners = store.GetListeners(RealPath(path));
         const auto note = [name = Join(path)](const char* kind) {
@@ -227,6 +284,14 @@ void VFiringRecorder::ListenTo(VDataStore& store)
         listeners.OnVerifiedChanged.Add(note("verified "));
         listeners.OnFlagsChanged.Add(note("flags "));
         listeners.OnAnyChange.Add(note("any "));
+        throws = !throws;
+        if (throws) {
+            for (auto* callback :
+                 {&listeners.OnRemoved, &listeners.OnProposalPending, &listeners.OnVerifiedChanged,
+                  &listeners.OnFlagsChanged, &listeners.OnAnyChange}) {
+                callback->Add(&Throw);
+            }
+        }
     }
     store.ReleaseWriteLock();
 }

@@ -18,16 +18,33 @@ const std::vector<Names>& HistoryListeners();
 /// Chooses the next step. @param writing  whether it may be a write
 VStoreStep RandomStep(std::mt19937& random, bool writing);
 
+/// The tokens that all threads of a history use at once, on whatever store.
+class VSharedTokens
+{
+public:
+    VSharedTokens();
+
+    /// Returns the token of a path of `RandomStep`, or null for one that is empty or has a
+    /// wildcard.
+    const VDataToken* Find(const Names& path) const;
+
+private:
+    std::map<Names, VDataToken> tokens;
+};
+
 /// Performs steps on a store, with results as the reference gives them. One for each thread.
 class VStepPerformer
 {
 public:
-    explicit VStepPerformer(VDataStore& store) : store(store) {}
+    VStepPerformer(VDataStore& store, const VSharedTokens& shared) : store(store), shared(shared) {}
 
     std::string Perform(const VStoreStep& step);
 
 private:
+    const VDataToken& TokenOf(const VStoreStep& step, const VDataToken& fresh);
+
     VDataStore& store;
+    const VSharedTokens& shared;
     std::map<Names, VDataToken> kept;
 };
 
@@ -35,7 +52,7 @@ private:
 class VFiringRecorder
 {
 public:
-    /// Adds listeners to all of `HistoryListeners`.
+    /// Adds listeners to all of `HistoryListeners`; every other one throws once it has noted.
     void ListenTo(VDataStore& store);
 
     /// Returns what came on the calling thread since the last time: in the order of coming, but
