@@ -16,7 +16,10 @@ template <typename Ch>
 class VTagScanner
 {
 public:
-    explicit VTagScanner(const Ch* text) : position(text) {}
+    VTagScanner(const Ch* text, bool readsDeclaration_)
+        : position(text), readsDeclaration(readsDeclaration_)
+    {
+    }
 
     /// Moves behind the next "<". False at the end of the text.
     bool FindTag()
@@ -55,7 +58,12 @@ public:
     bool SkipInstruction()
     {
         ++position;
-        return SkipBehind("?>");
+        if (!readsDeclaration || !IsAtDeclaration()) {
+            return SkipBehind("?>");
+        }
+        position += 4;
+        SkipWhiteSpace();
+        return SkipAttributes() && Take('?') && Take('>');
     }
 
     /// Moves behind a closing tag, whatever name it bears.
@@ -78,10 +86,8 @@ public:
             return false;
         }
         SkipWhiteSpace();
-        while (IsAttributeName(*position)) {
-            if (!SkipAttribute()) {
-                return false;
-            }
+        if (!SkipAttributes()) {
+            return false;
         }
         closed = Take('/');
         return Take('>');
@@ -111,6 +117,18 @@ private:
             ++expected;
         }
         return *expected == 0;
+    }
+
+    /// Whether "xml" and a blank follow, each letter in either case.
+    bool IsAtDeclaration() const
+    {
+        const char letters[] = "xmlXML";
+        for (std::size_t i = 0; i < 3; ++i) {
+            if (position[i] != Ch(letters[i]) && position[i] != Ch(letters[i + 3])) {
+                return false;
+            }
+        }
+        return IsWhiteSpace(position[3]);
     }
 
     bool SkipBehind(const char* end)
@@ -147,6 +165,16 @@ private:
         while (IsNodeName(*position)) {
             ++position;
         }
+    }
+
+    bool SkipAttributes()
+    {
+        while (IsAttributeName(*position)) {
+            if (!SkipAttribute()) {
+                return false;
+            }
+        }
+        return true;
     }
 
     bool SkipAttribute()
@@ -211,12 +239,13 @@ private:
     }
 
     const Ch* position;
+    const bool readsDeclaration;
 };
 
 } // namespace
 
 template <typename Ch>
-bool IsNestedWithin(const Ch* text, std::size_t levels)
+bool IsNestedWithin(const Ch* text, std::size_t levels, bool readsDeclaration)
 {
     // A level takes three characters at the least, "<a>", so that few messages need the scan.
     constexpr std::size_t charactersOfALevel = 3;
@@ -224,7 +253,7 @@ bool IsNestedWithin(const Ch* text, std::size_t levels)
         return true;
     }
 
-    VTagScanner<Ch> scanner(text);
+    VTagScanner<Ch> scanner(text, readsDeclaration);
     std::size_t depth = 0;
     while (scanner.FindTag()) {
         bool readable = true;
@@ -249,7 +278,7 @@ bool IsNestedWithin(const Ch* text, std::size_t levels)
     return true;
 }
 
-template bool IsNestedWithin(const char* text, std::size_t levels);
-template bool IsNestedWithin(const wchar_t* text, std::size_t levels);
+template bool IsNestedWithin(const char* text, std::size_t levels, bool readsDeclaration);
+template bool IsNestedWithin(const wchar_t* text, std::size_t levels, bool readsDeclaration);
 
 } // namespace UtilsRapidXml

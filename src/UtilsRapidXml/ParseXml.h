@@ -14,8 +14,11 @@ constexpr std::size_t MaximumNesting = 1000;
 /// it: up to the first zero, or to the first place that it refuses.
 ///
 /// Linear in the text, and needs no memory. Defined for char and wchar_t. [any]
+///
+/// @param readsDeclaration  whether the text is parsed with the flag parse_declaration_node: the
+///                          XML declaration then has attributes, whose values may hold its end
 template <typename Ch>
-bool IsNestedWithin(const Ch* text, std::size_t levels);
+bool IsNestedWithin(const Ch* text, std::size_t levels, bool readsDeclaration = false);
 
 /// Parses the text up to its first zero into `document`. This is the only way in which anything
 /// is parsed.
@@ -29,7 +32,8 @@ bool IsNestedWithin(const Ch* text, std::size_t levels);
 template <int Flags, typename Ch>
 bool ParseXml(rapidxml::xml_document<Ch>& document, Ch* text)
 {
-    if (!IsNestedWithin(text, MaximumNesting)) {
+    constexpr bool readsDeclaration = (Flags & rapidxml::parse_declaration_node) != 0;
+    if (!IsNestedWithin(text, MaximumNesting, readsDeclaration)) {
         document.clear();
         return false;
     }

@@ -265,6 +265,29 @@ const VHiddenCase hiddenCases[] = {
 INSTANTIATE_TEST_SUITE_P(Texts, NestingScan, testing::ValuesIn(hiddenCases),
                          [](const auto& parameters) { return parameters.param.name; });
 
+/// A declaration of which the parser, where it is to keep it, reads attributes: their values do not
+/// end it, and what looks like a comment in them hides no elements.
+TEST(NestingScan, SeesElementsBehindADeclarationThatIsKept)
+{
+    constexpr int keepDeclaration = rapidxml::parse_declaration_node;
+    for (const std::string declaration : {"<?xml a='?><!--'?>", "<?XmL\ta = \"?><![CDATA[\" ?>"}) {
+        const std::string deep =
+            declaration + Repeat<char>("<e>", 300000) + Repeat<char>("</e>", 300000);
+        std::string text = deep + "-->]]>";
+        rapidxml::xml_document<char> document;
+
+        EXPECT_FALSE(IsNestedWithin(deep.c_str(), MaximumNesting, true));
+        EXPECT_FALSE(ParseXml<keepDeclaration>(document, text.data()));
+    }
+    std::string proper = "<?xml version='1.0'?><!-- <a> --><a b='?>'/>";
+    rapidxml::xml_document<char> document;
+
+    EXPECT_TRUE(ParseXml<keepDeclaration>(document, proper.data()));
+    EXPECT_EQ(rapidxml::node_declaration, document.first_node()->type());
+    EXPECT_TRUE(IsNestedWithin("<?xml a='?><b><b>'?><a/>", 1, true));
+    EXPECT_TRUE(IsNestedWithin("<?xmlb a='?><a/>'?>", 1, true));
+}
+
 class NestingScanSkips : public testing::TestWithParam<VHiddenCase>
 {
 };
@@ -291,38 +314,48 @@ const VHiddenCase skippedCases[] = {
 INSTANTIATE_TEST_SUITE_P(Texts, NestingScanSkips, testing::ValuesIn(skippedCases),
                          [](const auto& parameters) { return parameters.param.name; });
 
-/// Every short text over the characters that matter: whatever the parser accepts has to lie exactly
-/// as deep as the scan says, and refusing needs a text that is deeper or that the parser refuses.
-TEST(NestingScan, AgreesWithTheParserOnEveryShortText)
+/// Parses every short text over the characters that matter, each in a frame: whatever the parser
+/// accepts has to lie exactly as deep as the scan says. @return how many were accepted
+template <int Flags>
+std::size_t CompareShortTexts(const std::string& front, const std::string& end)
 {
     const std::string alphabet = "<>/a\"'=!?- ";
     constexpr std::size_t length = 5;
+    constexpr bool readsDeclaration = (Flags & rapidxml::parse_declaration_node) != 0;
     std::vector<std::size_t> digits(length, 0);
     std::size_t accepted = 0;
-    bool more = true;
-    while (more) {
-        std::string text;
+    std::size_t place = 0;
+    while (place < length) {
+        std::string text = front;
         for (const std::size_t digit : digits) {
             text += alphabet[digit];
         }
-        // A frame around the text, so that short texts get inside of elements.
-        text = "<a>" + text + "b></b></a>";
+        text += end;
         std::string parsed = text;
         rapidxml::xml_document<char> document;
-        if (ParseXml<parse_non_destructive>(document, parsed.data())) {
+        if (ParseXml<Flags>(document, parsed.data())) {
             const std::size_t depth = DepthOf(document);
-            ASSERT_TRUE(IsNestedWithin(text.c_str(), depth)) << text;
-            ASSERT_FALSE(IsNestedWithin(text.c_str(), depth - 1)) << text;
+            EXPECT_TRUE(IsNestedWithin(text.c_str(), depth, readsDeclaration)) << text;
+            EXPECT_FALSE(IsNestedWithin(text.c_str(), depth - 1, readsDeclaration)) << text;
             ++accepted;
         }
-
-        std::size_t place = 0;
-        while (place < length && ++digits[place] == alphabet.size()) {
-            digits[place++] = 0;
+        for (place = 0; place < length && ++digits[place] == alphabet.size(); ++place) {
+            digits[place] = 0;
         }
-        more = place < length;
     }
-    EXPECT_GT(accepted, 1000U);
+    return accepted;
+}
+
+TEST(NestingScan, AgreesWithTheParserOnEveryShortText)
+{
+    EXPECT_GT(CompareShortTexts<parse_non_destructive>("<a>", "b></b></a>"), 1000U);
+}
+
+TEST(NestingScan, AgreesWithTheParserOnEveryShortDeclaration)
+{
+    constexpr int flags = parse_non_destructive | rapidxml::parse_declaration_node;
+
+    EXPECT_GT(CompareShortTexts<flags>("<?xml a=", "<b><c/></b>"), 10U);
 }
 
 } // namespace

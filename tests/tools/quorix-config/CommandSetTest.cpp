@@ -140,6 +140,20 @@ TEST_F(QuorixConfigSetTest, WritesNothingThatWouldBeLost)
                   "Nothing is written, since the file cannot be written anew without a loss");
 }
 
+TEST_F(QuorixConfigSetTest, ADeclarationHidesNoElementsFromTheEdit)
+{
+    // A load that skips the declaration takes it to end within the value, and all that follows for
+    // a comment; the edit keeps the declaration and would see its way down every element.
+    std::string elements;
+    for (int level = 0; level < 100000; ++level) {
+        elements += "<a>";
+    }
+    WriteFile(path, "<?xml a='?><!--'?>" + elements + "-->" + before);
+
+    ExpectRefusal({"get", path, "A.None"}, "There is no item A.None");
+    EXPECT_EQ(RunTool({"set", path, "A.Text", "\"y\""}).Code, 1);
+}
+
 TEST_F(QuorixConfigSetTest, ChangesTheItemThatCountsWhereThereAreTwo)
 {
     WriteFile(path, "<Configuration version='2.0'><Node name='A'><Item name='B' "
