@@ -52,6 +52,15 @@ TEST(ReaderNode, DeliversAttributesByExactName)
     EXPECT_THAT(found.Warnings, IsEmpty());
 }
 
+TEST(ReaderNode, DeliversAValueThatHoldsAZeroWhole)
+{
+    Load(R"(<R a="x&#0;y"/>)", [](INode& node) {
+        std::string value;
+        EXPECT_TRUE(Read(node, "a", value));
+        EXPECT_EQ(value, std::string("x\0y", 3));
+    });
+}
+
 TEST(ReaderNode, DeliversTheFirstOfTwoAttributesOfOneName)
 {
     Load(R"(<R a="1" a="2"/>)", [](INode& node) {
