@@ -14,6 +14,8 @@
 
 #include <atomic>
 #include <chrono>
+#include <cstdlib>
+#include <ctime>
 #include <memory>
 #include <stdexcept>
 #include <string>
@@ -77,6 +79,25 @@ TEST_F(AsioDeadlineTimer, FiresNoEarlierThanAfterItsTime)
 
     ASSERT_TRUE(fired.Wait());
     EXPECT_LE(std::chrono::milliseconds(50), firedAt - madeAt);
+}
+
+TEST_F(AsioDeadlineTimer, CountsOnTheSameTimeInEveryZone)
+{
+    const char* const present = std::getenv("TZ");
+    const std::string before = present != nullptr ? present : "";
+    setenv("TZ", "East-5", 1); // there it is five hours later
+    tzset();
+    VLatch fired;
+
+    StartDeadlineTimer(
+        service, [&fired] { fired.CountDown(); }, 1);
+
+    EXPECT_TRUE(fired.Wait());
+    setenv("TZ", before.c_str(), 1);
+    if (present == nullptr) {
+        unsetenv("TZ");
+    }
+    tzset();
 }
 
 TEST_F(AsioDeadlineTimer, FiresOnce)
@@ -226,9 +247,10 @@ TEST_F(AsioDeadlineTimer, ADeadTargetOfItsFunctionIsNoError)
 {
     const TestSupport::VLogCapture log;
     const std::weak_ptr<VLatch> gone = std::make_shared<VLatch>();
-    StartDeadlineTimer(
-        service, boost::bind(&VLatch::CountDown, boost::bind(&KVR::LockOrDeregister<VLatch>, gone)),
-        0);
+    const boost::function<void()> function =
+        boost::bind(&VLatch::CountDown, boost::bind(&KVR::LockOrDeregister<VLatch>, gone));
+    StartDeadlineTimer(service, function, 0);
+    const auto timer = MakeDeadlineTimer(service, function, 0);
     VLatch fired;
     StartDeadlineTimer(
         service, [&fired] { fired.CountDown(); }, 1);
