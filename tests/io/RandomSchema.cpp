@@ -1,5 +1,8 @@
 #include "io/RandomSchema.h"
 
+#include "io/SchemaComparison.h"
+#include "io/TypeWidth.h"
+
 #include <cstring>
 #include <limits>
 
@@ -12,32 +15,6 @@ bool IsNested(EType type)
     return type >= EType::Array && type <= EType::NamedTuple;
 }
 
-bool IsEnum(EType type)
-{
-    return type >= EType::Enum8 && type <= EType::Enum32;
-}
-
-unsigned WidthOf(EType type)
-{
-    switch (type) {
-    case EType::Bool:
-    case EType::Int8:
-    case EType::UInt8:
-    case EType::Enum8:
-        return 1;
-    case EType::Int16:
-    case EType::UInt16:
-    case EType::Enum16:
-        return 2;
-    case EType::Int32:
-    case EType::UInt32:
-    case EType::Enum32:
-        return 4;
-    default:
-        return 8;
-    }
-}
-
 } // namespace
 
 ISchema VRandomSchema::MakeSchema(unsigned depth, const Limits& limits)
@@ -48,7 +25,7 @@ ISchema VRandomSchema::MakeSchema(unsigned depth, const Limits& limits)
     } while ((depth <= 1 && IsNested(schema.Type)) ||
              (!limits.withoutText && (schema.Type == EType::Void || schema.Type == EType::Ref)));
 
-    if (IsEnum(schema.Type)) {
+    if (IsEnumType(schema.Type)) {
         const std::uint32_t count = 1 + Below(4);
         for (std::uint32_t i = 0; i < count; ++i) {
             // Different names and numbers, all within 8 bits.

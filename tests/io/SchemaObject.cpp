@@ -4,6 +4,7 @@
 #include "io/IInputStream.h"
 #include "io/NativeReaders.h"
 #include "io/SchemaComparison.h"
+#include "io/TypeWidth.h"
 
 #include <boost/bind/bind.hpp>
 
@@ -23,32 +24,6 @@ using ReaderPointer = std::shared_ptr<IReaderCollapsable>;
 using Elements = std::vector<std::unique_ptr<VSchemaObject>>;
 
 constexpr std::uint32_t mostUnstoredElements = 1000;
-
-std::uint64_t WidthOf(EType type)
-{
-    switch (type) {
-    case EType::Bool:
-    case EType::Int8:
-    case EType::UInt8:
-    case EType::Enum8:
-        return 1;
-    case EType::Int16:
-    case EType::UInt16:
-    case EType::Enum16:
-        return 2;
-    case EType::Int32:
-    case EType::UInt32:
-    case EType::Float32:
-    case EType::Enum32:
-        return 4;
-    case EType::Int64:
-    case EType::UInt64:
-    case EType::Float64:
-        return 8;
-    default:
-        return 0;
-    }
-}
 
 bool IsTuple(EType type)
 {
