@@ -1,5 +1,8 @@
 #include "QuorixDataStore/ListenerTree.h"
 
+#include <utility>
+#include <vector>
+
 namespace {
 
 constexpr std::string_view wildcard = "*";
@@ -12,6 +15,26 @@ void Add(const VDataListenerNode& node, VDataListenersList& listeners)
 }
 
 } // namespace
+
+VListenerTree::~VListenerTree()
+{
+    // Without recursion: a path may have any length.
+    std::vector<std::unique_ptr<VDataListenerNode>> nodes;
+    const auto takeBelow = [&nodes](VDataListenerNode& node) {
+        for (auto& [name, child] : node.Children) {
+            nodes.push_back(std::move(child));
+        }
+        if (node.Wildcard) {
+            nodes.push_back(std::move(node.Wildcard));
+        }
+    };
+    takeBelow(root);
+    while (!nodes.empty()) {
+        const std::unique_ptr<VDataListenerNode> node = std::move(nodes.back());
+        nodes.pop_back();
+        takeBelow(*node);
+    }
+}
 
 VDataListeners& VListenerTree::FindOrMake(const VDataPath& path)
 {
@@ -37,7 +60,7 @@ void VListenerTree::Collect(const VDataPath& path, VDataListenersList& listeners
         listeners.push_back(&found->second);
     }
     if (hasWildcards) {
-        CollectFrom(root, path, 0, listeners);
+        CollectByWildcards(path, listeners);
     }
 }
 
@@ -75,27 +98,29 @@ const VDataListeners* VListenerTree::FindWildcard(const VDataPath& path) const
     return node == nullptr ? nullptr : node->Listeners.get();
 }
 
-void VListenerTree::CollectFrom(const VDataListenerNode& from, const VDataPath& path,
-                                std::size_t index, VDataListenersList& listeners)
+void VListenerTree::CollectByWildcards(const VDataPath& path, VDataListenersList& listeners) const
 {
-    for (const VDataListenerNode* node = &from;;) {
-        if (index == path.Count()) {
-            Add(*node, listeners);
-            return;
+    struct VPlace
+    {
+        const VDataListenerNode* Node;
+        std::size_t Index; // of the component that comes next
+    };
+    boost::container::small_vector<VPlace, 8> places{{&root, 0}};
+    while (!places.empty()) {
+        const VPlace place = places.back();
+        places.pop_back();
+        if (place.Index == path.Count()) {
+            Add(*place.Node, listeners);
+            continue;
         }
-        const auto child = node->Children.find(path.Component(index));
-        if (child != node->Children.end()) {
-            CollectFrom(*child->second, path, index + 1, listeners);
+        const auto child = place.Node->Children.find(path.Component(place.Index));
+        if (child != place.Node->Children.end()) {
+            places.push_back({child->second.get(), place.Index + 1});
         }
-        node = node->Wildcard.get();
-        if (node == nullptr) {
-            return;
+        if (const VDataListenerNode* any = place.Node->Wildcard.get()) {
+            // A listener on "A.*" hears of every item below "A", however deep.
+            Add(*any, listeners);
+            places.push_back({any, place.Index + 1});
         }
-        // A listener on "A.*" hears of every item below "A", however deep.
-        Add(*node, listeners);
-        if (node->Children.empty() && !node->Wildcard) {
-            return;
-        }
-        ++index;
     }
 }

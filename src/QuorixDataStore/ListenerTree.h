@@ -30,6 +30,12 @@ using VDataListenersList = boost::container::small_vector<VDataListeners*, 8>;
 class VListenerTree
 {
 public:
+    VListenerTree() = default;
+    ~VListenerTree();
+
+    VListenerTree(const VListenerTree&) = delete;
+    VListenerTree& operator=(const VListenerTree&) = delete;
+
     /// Returns the record of a path, made if there is none.
     VDataListeners& FindOrMake(const VDataPath& path);
 
@@ -46,8 +52,7 @@ public:
 private:
     VDataListeners& FindOrMakeWildcard(const VDataPath& path);
     const VDataListeners* FindWildcard(const VDataPath& path) const;
-    static void CollectFrom(const VDataListenerNode& node, const VDataPath& path, std::size_t index,
-                            VDataListenersList& listeners);
+    void CollectByWildcards(const VDataPath& path, VDataListenersList& listeners) const;
 
     std::unordered_map<VDataPath, VDataListeners, VDataPathQuickHash>
         named;              // those without a wildcard

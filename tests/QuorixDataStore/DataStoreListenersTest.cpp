@@ -364,6 +364,25 @@ TEST_F(DataStoreListeners, ListenersStayAtTheirAddress)
     EXPECT_EQ(first, &std::as_const(store).GetListeners(VDataPath("A.*")));
 }
 
+TEST_F(DataStoreListeners, DeepPathsAreFine)
+{
+    VDataPath path;
+    for (int depth = 0; depth < 20000; ++depth) {
+        path.Append("d");
+    }
+    int heard = 0;
+    VDataWriter writer(store);
+    for (const char* last : {"*", "e"}) {
+        writer.GetListeners(VDataPath(path, last)).OnVerifiedChanged.Add([&] { ++heard; });
+    }
+    EXPECT_TRUE(writer.SetValue(VDataToken(VDataPath(path, "e")), Byte(1)));
+
+    {
+        const VDataWriter last(std::move(writer));
+    }
+    EXPECT_EQ(2, heard);
+}
+
 TEST_F(DataStoreListeners, ReadOnlyLookUpMakesNothing)
 {
     const IDataStore& reading = store;
