@@ -252,7 +252,7 @@ const VHiddenCase hiddenCases[] = {
     {"CdataInWrongCaseEndsAtItsFirstBracket", "<![cdata[>"},
     {"DoctypeWithQuote", "<!DOCTYPE a '>"},
     {"DoctypeWithBrackets", "<!DOCTYPE [ ' [ ] > ]>"},
-    {"DoctypeWithoutBlankEndsAtItsFirstBracket", "<!DOCTYPE[>"},
+    {"DoctypeWithoutBlankEndsAtItsFirstBracket", "<!DOCTYPE[[>"},
     {"InstructionWithQuote", "<?a ' ?>"},
     {"InstructionWithQuestionMarks", "<???" "?>"},
     {"Declaration", "<?xml version='1.0' ?>"},
@@ -302,6 +302,7 @@ TEST_P(NestingScanSkips, WhatHoldsNoElements)
 // clang-format off
 const VHiddenCase skippedCases[] = {
     {"Comment", "<a><!-- <b><c> > --></a>"},
+    {"CommentThatBeginsLikeItsEnd", "<a><!--><b><c>--></a>"},
     {"Cdata", "<a><![CDATA[<b><c>]]></a>"},
     {"Instruction", "<a><?b <c><d>?></a>"},
     {"Doctype", "<!DOCTYPE a [<!ELEMENT a <b><c>]><a/>"},

@@ -443,4 +443,19 @@ TEST(ReaderNode, AMessageBeyondTheRoomIsCountedOnly)
     EXPECT_THAT(found.Errors, ElementsAre("first", great, "And 2 more messages of this kind"));
 }
 
+TEST(ReaderNode, MessagesWithoutTextTakeRoomToo)
+{
+    constexpr std::size_t most = VMessageList::GreatestSize / sizeof(std::string);
+    VMessageList messages;
+    for (std::size_t each = 0; each < most + 2; ++each) {
+        messages.Add("");
+    }
+    Texts kept;
+    messages.AppendTo(kept);
+
+    EXPECT_EQ(messages.Count(), most + 2);
+    EXPECT_EQ(kept.size(), most + 1);
+    EXPECT_EQ(kept.back(), "And 2 more messages of this kind");
+}
+
 } // namespace
