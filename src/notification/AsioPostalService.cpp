@@ -10,6 +10,7 @@
 #include <boost/thread/thread.hpp>
 
 #include <sys/resource.h>
+#include <unistd.h>
 
 #include <utility>
 
@@ -76,10 +77,11 @@ void RaisePriority()
 {
     // Deliberate: every postal thread runs a step above the process's others, since devices wait
     // for it. Without the right to raise itself a thread runs as it is. Linux takes 0 for the
-    // calling thread alone, which begins with the niceness of whoever made it.
+    // calling thread alone, which begins with the niceness of whoever made it: the step counts from
+    // the first thread of the process, as a postal thread may have made this one.
     constexpr int stepAbove = -1;
-    const int present = getpriority(PRIO_PROCESS, 0);
-    static_cast<void>(setpriority(PRIO_PROCESS, 0, present + stepAbove));
+    const int normal = getpriority(PRIO_PROCESS, static_cast<id_t>(getpid()));
+    static_cast<void>(setpriority(PRIO_PROCESS, 0, normal + stepAbove));
 }
 
 /// Runs queued functions and completions until the service has been stopped and nothing is left.

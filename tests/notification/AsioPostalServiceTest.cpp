@@ -158,6 +158,27 @@ TEST(AsioPostalService, RunsItsThreadsAboveNormalWhereItMay)
     EXPECT_EQ(permitted == 0 ? above : present, priority);
 }
 
+TEST(AsioPostalService, RunsThreadsThatItsOwnThreadMadeNoHigher)
+{
+    VAsioPostalService service("X", 1, 0);
+    int outer = 0;
+    int inner = 0;
+    VLatch called;
+
+    service.Post(
+        [&] {
+            outer = getpriority(PRIO_PROCESS, 0);
+            VAsioPostalService made("Y", 1, 0);
+            made.Post([&inner] { inner = getpriority(PRIO_PROCESS, 0); }, 0);
+            made.Stop();
+            called.CountDown();
+        },
+        0);
+
+    ASSERT_TRUE(called.Wait());
+    EXPECT_EQ(outer, inner);
+}
+
 TEST(AsioPostalService, StartsAndStopsAnyNumberOfTimesWithAnyNumberOfThreads)
 {
     VAsioPostalService service("X", 1, 0);
