@@ -64,7 +64,7 @@ private:
 
     void Release(bool (VChangeLocks::*remove)(std::uint64_t));
 
-    mutable KVR::VMutex stateMutex;       // nothing else is taken under it but a log's own mutexes
+    mutable KVR::VMutex stateMutex;       // only that of the threads' names is taken under it
     std::condition_variable changeSignal; // to all, when the change id has advanced
     VChangeLocks changeLocks KVR_GUARDED_BY(stateMutex);
 
