@@ -1,10 +1,14 @@
 #include "ConnectionFixture.h"
+#include "QuorixPluginControlStreamServer/ControlStreamServer/LastBytes.h"
 #include "TooMuch.h"
 #include "support/RawClient.h"
 
 #include <gtest/gtest.h>
 
+#include <sys/ioctl.h>
+
 #include <atomic>
+#include <chrono>
 #include <memory>
 #include <string>
 #include <thread>
@@ -14,6 +18,7 @@
 
 namespace {
 
+using ControlStreamServer::AwaitLastBytes;
 using ControlStreamServer::IClientConnection;
 using TestSupport::VRawClient;
 
@@ -95,13 +100,18 @@ class LastBytes : public VConnectionFixture
 protected:
     LastBytes() : client(socket->Port(), SmallBuffer), connection(ConnectionOf(0).lock())
     {
-        onMessage = [this](const std::shared_ptr<IClientConnection>&) { held.Wait(); };
+        onMessage = [this](const std::shared_ptr<IClientConnection>&) {
+            entered.Open();
+            held.Wait();
+        };
         client.SendFrame("holds the reading");
+        entered.Wait();
         client.SendFrame("unread");
     }
 
     ~LastBytes() override { held.Open(); }
 
+    VLatch entered;
     VLatch held;
     VRawClient client;
     std::shared_ptr<IClientConnection> connection;
@@ -127,6 +137,42 @@ TEST_F(LastBytes, AreLeftToTheSystemWhereTheDeviceDoesNotReadThem)
     connection->Close(); // returns
 
     EXPECT_EQ(text, client.ReadFrame());
+}
+
+/// Many devices that read no more would otherwise add up to a stop that does not end.
+TEST_F(LastBytes, AreWaitedForOnlyWhileTheDeviceTakesThem)
+{
+    const int descriptor = OtherEndOf(client);
+    connection->Send(std::wstring(std::size_t{64} * 1024, L'x'));
+
+    AwaitLastBytes(descriptor, std::chrono::hours(1)); // returns
+
+    std::thread sending([this] {
+        while (client.SendFrame("without end")) {
+        }
+    });
+    AwaitLastBytes(descriptor, std::chrono::hours(1)); // returns
+    connection->Close();
+    sending.join();
+}
+
+/// The wait throws away what comes in, so that nothing behind it can be told from a frame.
+TEST_F(LastBytes, AreWaitedForWithNothingDeliveredAnyMore)
+{
+    connection->Send(std::wstring(std::size_t{64} * 1024, L'x'));
+    const int descriptor = OtherEndOf(client);
+    std::thread closing([this] { connection->Close(); });
+    EXPECT_TRUE(BecomesTrue([descriptor] {
+        int unread = 0;
+        return ::ioctl(descriptor, FIONREAD, &unread) != 0 || unread == 0;
+    }));
+
+    held.Open();
+    while (client.SendFrame("late")) {
+    }
+
+    closing.join();
+    EXPECT_EQ(std::vector<std::wstring>{L"holds the reading"}, messages.Wait(1));
 }
 
 } // namespace

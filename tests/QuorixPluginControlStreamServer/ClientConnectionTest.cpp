@@ -352,23 +352,6 @@ TEST_F(ClientConnection, OutlivesItsSocketOnceClosed)
     EXPECT_EQ("", client.ReadToEnd());
 }
 
-/// Returns the descriptor of this process's other end of a connection.
-int OtherEndOf(const VRawClient& client)
-{
-    sockaddr_in own{};
-    socklen_t size = sizeof own;
-    EXPECT_EQ(0, ::getsockname(client.Descriptor(), reinterpret_cast<sockaddr*>(&own), &size));
-    for (int descriptor = 3; descriptor < 1024; ++descriptor) {
-        sockaddr_in peer{};
-        size = sizeof peer;
-        if (::getpeername(descriptor, reinterpret_cast<sockaddr*>(&peer), &size) == 0 &&
-            peer.sin_family == AF_INET && peer.sin_port == own.sin_port) {
-            return descriptor;
-        }
-    }
-    return -1;
-}
-
 TEST_F(ClientConnection, CloseThrowsWithItsLocationWhereTheSystemRefuses)
 {
     VRawClient client(socket->Port());

@@ -4,12 +4,31 @@
 #include "QuorixPluginControlStreamServer/ControlStreamServer/ClientConnectionASIO.h"
 #include "QuorixPluginControlStreamServer/ControlStreamServer/SocketASIO.h"
 
+#include "support/RawClient.h"
+
 #include <boost/function.hpp>
 #include <gtest/gtest.h>
 
 #include <cstddef>
 #include <memory>
 #include <string>
+
+/// Returns the descriptor of this process's other end of a connection.
+inline int OtherEndOf(const TestSupport::VRawClient& client)
+{
+    sockaddr_in own{};
+    socklen_t size = sizeof own;
+    EXPECT_EQ(0, ::getsockname(client.Descriptor(), reinterpret_cast<sockaddr*>(&own), &size));
+    for (int descriptor = 3; descriptor < 1024; ++descriptor) {
+        sockaddr_in peer{};
+        size = sizeof peer;
+        if (::getpeername(descriptor, reinterpret_cast<sockaddr*>(&peer), &size) == 0 &&
+            peer.sin_family == AF_INET && peer.sin_port == own.sin_port) {
+            return descriptor;
+        }
+    }
+    return -1;
+}
 
 /// Accepts connections and collects their messages; nobody answers.
 class VConnectionFixture : public testing::Test

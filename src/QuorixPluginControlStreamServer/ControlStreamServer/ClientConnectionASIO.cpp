@@ -35,7 +35,7 @@ template <typename Buffers, typename Handler>
 void VClientConnectionASIO::VStream::async_read_some(const Buffers& buffers, Handler&& handler)
 {
     KVR::VMutexLock lock(connection.socketMutex);
-    if (connection.socket) {
+    if (!connection.closing) {
         connection.socket->async_read_some(buffers, std::forward<Handler>(handler));
     }
     // A closed connection reads no more: the handler goes uncalled, and with it the reading's
@@ -99,6 +99,12 @@ void VClientConnectionASIO::OnBody()
 
 void VClientConnectionASIO::Deliver()
 {
+    {
+        KVR::VMutexLock lock(socketMutex);
+        if (closing) {
+            return; // and the wait for the last bytes may have taken some of these
+        }
+    }
     // To its end, replies included, before another byte is read.
     messageCallback(shared_from_this(), KVR::Utf8ToWide(incomingBody.data(), incomingBody.size()));
     ReadHeader();
@@ -128,35 +134,29 @@ void VClientConnectionASIO::Send(const std::wstring& message)
 
 void VClientConnectionASIO::Close()
 {
-    {
-        KVR::VMutexLock socketLock(socketMutex);
-        if (!socket) {
-            return;
-        }
-        // Closing alone would leave a writer blocked, and this call with it. An error says that the
-        // device has gone already.
-        static_cast<void>(::shutdown(socket->native_handle(), SHUT_WR));
+    const std::shared_ptr<tcp::socket> closed = BeginClosing();
+    if (!closed) {
+        return;
     }
-    KVR::VMutexLock lock(mutex); // keeps the socket from being closed by another call meanwhile
-    AwaitLastBytesOfSocket();
+    KVR::VMutexLock lock(mutex); // no writer is inside of the socket any more
+    AwaitLastBytes(closed->native_handle(), lastBytesLimit);
     KVR::VMutexLock socketLock(socketMutex);
-    const std::shared_ptr<tcp::socket> closed = std::move(socket);
-    if (closed) {
-        closed->close();
-    }
+    socket.reset();
+    closed->close();
 }
 
-void VClientConnectionASIO::AwaitLastBytesOfSocket()
+std::shared_ptr<tcp::socket> VClientConnectionASIO::BeginClosing()
 {
-    int descriptor = -1;
-    {
-        KVR::VMutexLock socketLock(socketMutex);
-        if (!socket) {
-            return;
-        }
-        descriptor = socket->native_handle();
+    KVR::VMutexLock lock(socketMutex);
+    if (closing) {
+        return nullptr;
     }
-    AwaitLastBytes(descriptor, lastBytesLimit);
+    closing = true;
+    // Closing alone would leave a writer blocked, and the caller with it. An error says that the
+    // device has gone already. Not SHUT_RDWR: at the next bytes that come the system would reset
+    // the connection, and forget what it has still to send.
+    static_cast<void>(::shutdown(socket->native_handle(), SHUT_WR));
+    return socket;
 }
 
 VClientConnectionASIO::~VClientConnectionASIO() noexcept(false)

@@ -35,8 +35,8 @@ public:
     VClientConnectionASIO(const VClientConnectionASIO&) = delete;
     VClientConnectionASIO& operator=(const VClientConnectionASIO&) = delete;
 
-    /// Ends the stream and closes the socket. Waits a second at most for the device's system to
-    /// take what was sent, where it has not yet.
+    /// Ends the reading and the stream, and closes the socket. Waits a moment for a device that
+    /// still takes what was sent, and a second at most.
     void Close() override;
     void Send(const std::wstring& message) override;
     MessageCallback& GetMessageCallback() override { return messageCallback; }
@@ -71,8 +71,8 @@ private:
     void OnBody();
     void Deliver();
 
-    /// Waits, with a limit, until what was written has left for the device.
-    void AwaitLastBytesOfSocket() KVR_REQUIRES(mutex);
+    /// Ends the reading and the stream. @return the socket, for whoever called first to close
+    std::shared_ptr<boost::asio::ip::tcp::socket> BeginClosing();
 
     KVR::VMutex mutex; // serialises Send; lock order: this one, then socketMutex
     // Guards the socket's handle and the start of every read, which a close beside it would race
@@ -80,6 +80,7 @@ private:
     KVR::VMutex socketMutex;
     // Gone once closed; goes and is closed only under both mutexes, so that either keeps it.
     std::shared_ptr<boost::asio::ip::tcp::socket> socket KVR_GUARDED_BY(socketMutex);
+    bool closing KVR_GUARDED_BY(socketMutex) = false; // nothing is read or delivered any more
     std::uint32_t incomingLength = 0;
     std::vector<char> incomingBody; // kept from frame to frame
     NotificationSystem::VCallbackPostal<void(std::shared_ptr<IClientConnection>, std::wstring)>

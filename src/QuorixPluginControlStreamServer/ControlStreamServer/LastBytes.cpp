@@ -3,6 +3,7 @@
 #include <array>
 #include <cerrno>
 #include <cstddef>
+#include <utility>
 
 #include <linux/sockios.h>
 #include <poll.h>
@@ -13,10 +14,10 @@ namespace ControlStreamServer {
 
 namespace {
 
-bool IsEverythingOnItsWay(int descriptor)
+int BytesNotSent(int descriptor)
 {
     int unsent = 0;
-    return ::ioctl(descriptor, SIOCOUTQNSD, &unsent) != 0 || unsent == 0;
+    return ::ioctl(descriptor, SIOCOUTQNSD, &unsent) == 0 ? unsent : 0;
 }
 
 /// @return false where the peer has ended the stream or the connection is broken
@@ -31,15 +32,26 @@ bool ThrowAwayWhatCame(int descriptor)
 
 void AwaitLastBytes(int descriptor, std::chrono::milliseconds limit)
 {
+    using std::chrono::steady_clock;
     // The system tells nobody when it has sent a byte, so it is asked again when some come, or
     // soon.
     constexpr int soon = 2; // milliseconds
-    const auto deadline = std::chrono::steady_clock::now() + limit;
-    while (!IsEverythingOnItsWay(descriptor) && std::chrono::steady_clock::now() < deadline) {
+    constexpr std::chrono::milliseconds patience{50};
+
+    auto now = steady_clock::now();
+    const auto deadline = now + limit;
+    auto lastTaken = now;
+    int unsent = BytesNotSent(descriptor);
+    while (unsent > 0 && now < deadline && now < lastTaken + patience) {
         pollfd poller{descriptor, POLLIN, 0};
         static_cast<void>(::poll(&poller, 1, soon));
         if (!ThrowAwayWhatCame(descriptor)) {
             return;
+        }
+        now = steady_clock::now();
+        const int before = std::exchange(unsent, BytesNotSent(descriptor));
+        if (unsent < before) {
+            lastTaken = now;
         }
     }
 }

@@ -4,7 +4,7 @@
 
 namespace ControlStreamServer {
 
-/// How long a close waits, at most, for a device to make room for what it is still owed.
+/// How long a close waits, at most, for a device that takes what it is still owed.
 constexpr std::chrono::milliseconds lastBytesLimit{1000};
 
 /// Waits until everything that was written to a TCP socket has left for the peer; meanwhile it
@@ -12,7 +12,8 @@ constexpr std::chrono::milliseconds lastBytesLimit{1000};
 ///
 /// A system that closes a socket with unread bytes resets the connection and forgets what it had
 /// still to send, so that a device which is sending would not hear the last event.
-/// Returns early where the peer has gone. [any]
+/// Returns early where the peer has gone, and where it takes nothing for 50 ms: many devices that
+/// do not read would add up to a stop without end. [any]
 void AwaitLastBytes(int descriptor, std::chrono::milliseconds limit);
 
 } // namespace ControlStreamServer

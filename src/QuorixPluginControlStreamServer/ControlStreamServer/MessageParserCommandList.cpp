@@ -4,10 +4,13 @@
 #include "QuorixPluginControlStreamServer/ControlStreamServer/ReplyDocument.h"
 #include "QuorixPluginControlStreamServer/ControlSystem/IControlSystem.h"
 
+#include <string_view>
 #include <utility>
 #include <vector>
 
 namespace ControlStreamServer {
+
+using namespace std::string_view_literals; // their lengths are known before they are needed
 
 namespace {
 
@@ -16,10 +19,10 @@ std::wstring BuildReply(const std::wstring& correlation, const std::vector<std::
     VReplyDocument reply;
     // Deliberate: Correlation stands beside Commands, so this reply alone has two top-level
     // elements. Devices look for it there; do not move it inside to match the other replies.
-    reply.AddElement(reply.Top(), L"Correlation", correlation);
-    VReplyDocument::VElement& commands = reply.AddElement(reply.Top(), L"Commands");
+    reply.AddElement(reply.Top(), L"Correlation"sv, correlation);
+    VReplyDocument::VElement& commands = reply.AddElement(reply.Top(), L"Commands"sv);
     for (const std::wstring& name : names) {
-        reply.AddElement(commands, L"Command", name);
+        reply.AddElement(commands, L"Command"sv, name);
     }
     return reply.Print();
 }
@@ -27,14 +30,14 @@ std::wstring BuildReply(const std::wstring& correlation, const std::vector<std::
 } // namespace
 
 VMessageParserCommandList::VMessageParserCommandList(std::shared_ptr<IControlSystem> controlSystem)
-    : VMessageParser(L"Commands"), controlSystem(std::move(controlSystem))
+    : VMessageParser(L"Commands"sv), controlSystem(std::move(controlSystem))
 {
 }
 
 bool VMessageParserCommandList::Answer(const std::shared_ptr<IClientConnection>& connection,
                                        const VElement& root)
 {
-    const std::wstring correlation = ChildValue(root, L"Correlation");
+    const std::wstring correlation = ChildValue(root, L"Correlation"sv);
     if (correlation.empty()) {
         return false;
     }

@@ -4,21 +4,24 @@
 #include "QuorixPluginControlStreamServer/ControlStreamServer/ReplyDocument.h"
 #include "QuorixPluginControlStreamServer/ControlSystem/IControlSystem.h"
 
+#include <string_view>
 #include <utility>
 
 namespace ControlStreamServer {
+
+using namespace std::string_view_literals; // their lengths are known before they are needed
 
 namespace {
 
 std::wstring BuildReply(const ControlSystem::IEventInformation& information)
 {
     VReplyDocument reply;
-    VReplyDocument::VElement& root = reply.AddElement(reply.Top(), L"EventInformation");
-    reply.AddElement(root, L"Name", information.Name);
-    reply.AddElement(root, L"Description", information.Description);
-    VReplyDocument::VElement& parameters = reply.AddElement(root, L"Parameters");
+    VReplyDocument::VElement& root = reply.AddElement(reply.Top(), L"EventInformation"sv);
+    reply.AddElement(root, L"Name"sv, information.Name);
+    reply.AddElement(root, L"Description"sv, information.Description);
+    VReplyDocument::VElement& parameters = reply.AddElement(root, L"Parameters"sv);
     for (const ControlSystem::IParameterInformation& parameter : information.Parameters) {
-        reply.AddParameter(parameters, parameter.Name, L"Description", parameter.Description);
+        reply.AddParameter(parameters, parameter.Name, L"Description"sv, parameter.Description);
     }
     return reply.Print();
 }
@@ -27,7 +30,7 @@ std::wstring BuildReply(const ControlSystem::IEventInformation& information)
 
 VMessageParserEventInformation::VMessageParserEventInformation(
     std::shared_ptr<IControlSystem> controlSystem)
-    : VMessageParser(L"EventInformation"), controlSystem(std::move(controlSystem))
+    : VMessageParser(L"EventInformation"sv), controlSystem(std::move(controlSystem))
 {
 }
 

@@ -4,19 +4,22 @@
 #include "QuorixPluginControlStreamServer/ControlStreamServer/ReplyDocument.h"
 #include "QuorixPluginControlStreamServer/ControlSystem/IControlSystem.h"
 
+#include <string_view>
 #include <utility>
 #include <vector>
 
 namespace ControlStreamServer {
+
+using namespace std::string_view_literals; // their lengths are known before they are needed
 
 namespace {
 
 std::wstring BuildReply(const std::vector<std::wstring>& names)
 {
     VReplyDocument reply;
-    VReplyDocument::VElement& events = reply.AddElement(reply.Top(), L"Events");
+    VReplyDocument::VElement& events = reply.AddElement(reply.Top(), L"Events"sv);
     for (const std::wstring& name : names) {
-        reply.AddElement(events, L"Event", name);
+        reply.AddElement(events, L"Event"sv, name);
     }
     return reply.Print();
 }
@@ -24,7 +27,7 @@ std::wstring BuildReply(const std::vector<std::wstring>& names)
 } // namespace
 
 VMessageParserEventList::VMessageParserEventList(std::shared_ptr<IControlSystem> controlSystem)
-    : VMessageParser(L"Events"), controlSystem(std::move(controlSystem))
+    : VMessageParser(L"Events"sv), controlSystem(std::move(controlSystem))
 {
 }
 

@@ -8,9 +8,12 @@
 #include <boost/algorithm/string/replace.hpp>
 #include <boost/bind/bind.hpp>
 
+#include <string_view>
 #include <utility>
 
 namespace ControlStreamServer {
+
+using namespace std::string_view_literals; // their lengths are known before they are needed
 
 namespace {
 
@@ -28,10 +31,10 @@ std::wstring BuildReply(const VRequest& request, std::int32_t code,
                         const ControlSystem::IParameters& parameters)
 {
     VReplyDocument reply;
-    VReplyDocument::VElement& root = reply.AddElement(reply.Top(), L"CommandReply");
-    reply.AddElement(root, L"Name", request.Name);
-    reply.AddElement(root, L"Correlation", request.Correlation);
-    reply.AddElement(root, L"Result", ResultText(code));
+    VReplyDocument::VElement& root = reply.AddElement(reply.Top(), L"CommandReply"sv);
+    reply.AddElement(root, L"Name"sv, request.Name);
+    reply.AddElement(root, L"Correlation"sv, request.Correlation);
+    reply.AddElement(root, L"Result"sv, ResultText(code));
     reply.AddParameters(root, parameters);
     return reply.Print();
 }
@@ -64,7 +67,7 @@ void DecodeEntities(std::wstring& value)
 
 VMessageParserExecuteCommand::VMessageParserExecuteCommand(
     std::shared_ptr<IControlSystem> controlSystem)
-    : VMessageParser(L"ExecuteCommand"), controlSystem(std::move(controlSystem))
+    : VMessageParser(L"ExecuteCommand"sv), controlSystem(std::move(controlSystem))
 {
 }
 
@@ -73,11 +76,11 @@ bool VMessageParserExecuteCommand::Answer(const std::shared_ptr<IClientConnectio
 {
     const auto request = std::make_shared<VRequest>();
     request->Connection = connection;
-    request->Name = ChildValue(root, L"Name");
+    request->Name = ChildValue(root, L"Name"sv);
     if (request->Name.empty()) {
         return false;
     }
-    request->Correlation = ChildValue(root, L"Correlation");
+    request->Correlation = ChildValue(root, L"Correlation"sv);
     if (request->Correlation.empty()) {
         return false;
     }
@@ -96,16 +99,16 @@ bool VMessageParserExecuteCommand::Answer(const std::shared_ptr<IClientConnectio
 bool VMessageParserExecuteCommand::ReadParameters(const VElement& root,
                                                   ControlSystem::IParameters& parameters)
 {
-    const VElement* list = FindChild(root, L"Parameters");
-    const VElement* parameter = list != nullptr ? FindChild(*list, L"Parameter") : nullptr;
+    const VElement* list = FindChild(root, L"Parameters"sv);
+    const VElement* parameter = list != nullptr ? FindChild(*list, L"Parameter"sv) : nullptr;
     // Deliberate: only the first is looked for by its name. From there on every sibling counts as a
     // parameter, whatever it is, and one without a name spoils the whole message.
     for (; parameter != nullptr; parameter = parameter->next_sibling()) {
-        std::wstring name = ChildValue(*parameter, L"Name");
+        std::wstring name = ChildValue(*parameter, L"Name"sv);
         if (name.empty()) {
             return false;
         }
-        std::wstring value = ChildValue(*parameter, L"Value");
+        std::wstring value = ChildValue(*parameter, L"Value"sv);
         // Deliberate: the value alone is decoded, also where the XML parser has decoded it before.
         DecodeEntities(value);
         parameters.Set(std::move(name), std::move(value));

@@ -5,9 +5,12 @@
 #include <array>
 #include <cstddef>
 #include <string>
+#include <string_view>
 #include <utility>
 
 namespace ControlStreamServer {
+
+using namespace std::string_view_literals; // their lengths are known before they are needed
 
 namespace {
 
@@ -16,50 +19,56 @@ namespace {
 class VTextCollector
 {
 public:
-    void Put(wchar_t character)
+    wchar_t* Begin() { return room.data(); }
+    const wchar_t* End() const { return room.data() + room.size(); }
+
+    /// Moves on what stands before a place. @return where the next character goes
+    wchar_t* MoveOn(const wchar_t* place)
     {
-        if (used == room.size()) {
-            MoveOn();
-        }
-        room[used++] = character;
+        text.append(room.data(), static_cast<std::size_t>(place - room.data()));
+        return room.data();
     }
 
-    /// Returns the whole text. Called once, at the end.
-    std::wstring Take()
+    /// Returns the whole text, which ends at a place. Called once, at the end.
+    std::wstring Take(const wchar_t* place)
     {
-        MoveOn();
+        MoveOn(place);
         return std::move(text);
     }
 
 private:
-    void MoveOn()
-    {
-        text.append(room.data(), used);
-        used = 0;
-    }
-
     std::array<wchar_t, 1024> room; // not cleared: only what was put there is read
-    std::size_t used = 0;
     std::wstring text;
 };
 
-/// The form in which RapidXml wants to write: every assignment puts one character.
+/// The form in which RapidXml wants to write: every assignment puts one character. RapidXml hands
+/// its writer on from function to function, so that the place can stay in a register.
 class VTextWriter
 {
 public:
-    explicit VTextWriter(VTextCollector& collector) : collector(&collector) {}
+    explicit VTextWriter(VTextCollector& collector)
+        : collector(&collector), place(collector.Begin()), end(collector.End())
+    {
+    }
 
     VTextWriter& operator*() { return *this; }
     VTextWriter& operator++() { return *this; }
-    VTextWriter operator++(int) { return *this; }
+    VTextWriter& operator++(int) { return *this; } // not a copy, which would put the character
     VTextWriter& operator=(wchar_t character)
     {
-        collector->Put(character);
+        if (place == end) {
+            place = collector->MoveOn(place);
+        }
+        *place++ = character;
         return *this;
     }
 
+    const wchar_t* Place() const { return place; }
+
 private:
     VTextCollector* collector;
+    wchar_t* place;
+    const wchar_t* end;
 };
 
 } // namespace
@@ -68,10 +77,10 @@ VReplyDocument::VReplyDocument()
 {
     VElement* declaration = document.allocate_node(rapidxml::node_declaration);
     document.append_node(declaration);
-    AddAttribute(*declaration, L"version", L"1.0");
+    AddAttribute(*declaration, L"version"sv, L"1.0"sv);
     // Deliberate: the text goes out as UTF-8, and says UTF-16 all the same. Devices know it so.
-    AddAttribute(*declaration, L"encoding", L"UTF-16");
-    AddAttribute(*declaration, L"standalone", L"no");
+    AddAttribute(*declaration, L"encoding"sv, L"UTF-16"sv);
+    AddAttribute(*declaration, L"standalone"sv, L"no"sv);
 }
 
 VReplyDocument::VElement& VReplyDocument::AddElement(VElement& parent, std::wstring_view name,
@@ -87,24 +96,25 @@ VReplyDocument::VElement& VReplyDocument::AddElement(VElement& parent, std::wstr
 void VReplyDocument::AddParameter(VElement& parent, std::wstring_view name,
                                   std::wstring_view secondName, std::wstring_view secondValue)
 {
-    VElement& parameter = AddElement(parent, L"Parameter");
-    AddElement(parameter, L"Name", name);
+    VElement& parameter = AddElement(parent, L"Parameter"sv);
+    AddElement(parameter, L"Name"sv, name);
     AddElement(parameter, secondName, secondValue);
 }
 
 void VReplyDocument::AddParameters(VElement& parent, const ControlSystem::IParameters& parameters)
 {
-    VElement& list = AddElement(parent, L"Parameters");
+    VElement& list = AddElement(parent, L"Parameters"sv);
     for (const auto& [name, value] : parameters) {
-        AddParameter(list, name, L"Value", value);
+        AddParameter(list, name, L"Value"sv, value);
     }
 }
 
 std::wstring VReplyDocument::Print() const
 {
     VTextCollector collector;
-    rapidxml::print(VTextWriter(collector), document, rapidxml::print_no_indenting);
-    return collector.Take();
+    const VTextWriter end =
+        rapidxml::print(VTextWriter(collector), document, rapidxml::print_no_indenting);
+    return collector.Take(end.Place());
 }
 
 void VReplyDocument::AddAttribute(VElement& element, std::wstring_view name,
