@@ -10,6 +10,7 @@
 #include <array>
 #include <cstdint>
 #include <cstdlib>
+#include <cstring>
 #include <limits>
 #include <utility>
 
@@ -160,13 +161,14 @@ private:
     bool SkipCharacters()
     {
         std::size_t depth = 0;
-        std::string ignored;
         for (;;) {
+            // A value is skipped once for every level that it lies in, so the runs are long.
+            cursor += std::strcspn(cursor, "\"[]{},");
             switch (*cursor) {
             case '\0':
                 return false;
             case '"':
-                if (!ReadQuoted(ignored)) {
+                if (!SkipQuoted()) {
                     return false;
                 }
                 if (depth == 0) {
@@ -188,14 +190,29 @@ private:
                     return true;
                 }
                 break;
-            case ',':
+            default: // a comma
                 if (depth == 0) {
                     return true;
                 }
                 ++cursor;
-                break;
-            default:
-                ++cursor;
+            }
+        }
+    }
+
+    /// Moves behind the quoted string that begins here.
+    bool SkipQuoted()
+    {
+        ++cursor;
+        for (;;) {
+            cursor += std::strcspn(cursor, "\"\\");
+            const bool isEscape = *cursor == '\\';
+            cursor += isEscape ? 1 : 0;
+            if (*cursor == '\0') {
+                return false;
+            }
+            ++cursor;
+            if (!isEscape) {
+                return true;
             }
         }
     }
