@@ -286,6 +286,11 @@ TEST(SchemaTextReader, SkippedValueEndsWithItsFirstStringOrBracket)
     EXPECT_TRUE(Fails(R"({"x":[1]2,"Type":"Bool"})"));
     EXPECT_TRUE(Fails(R"({"x":"a)"));
     EXPECT_TRUE(Fails(R"({"x":["a])"));
+    EXPECT_TRUE(Fails(R"({"x":"a\)"));
+    EXPECT_TRUE(Fails(R"({"x":"a\")"));
+    EXPECT_TRUE(Fails(R"({"x":"a\","Type":"Bool"})"));
+    EXPECT_EQ(EType::Bool, Read(R"({"x":"a\\","Type":"Bool"})").Type);
+    EXPECT_EQ(EType::Bool, Read(R"({"x":["\\\"]",","],"Type":"Bool"})").Type);
 }
 
 TEST(SchemaTextReader, FirstOfDuplicatedKeysCounts)
