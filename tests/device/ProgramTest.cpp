@@ -300,6 +300,25 @@ TEST(ProgramFailure, OutputThatCannotBeWrittenIsOne)
     EXPECT_EQ(1, WEXITSTATUS(status));
 }
 
+TEST(ProgramFailure, ClosedOutputIsNeverTakenForTheConnection)
+{
+    std::string rest;
+    VScriptedHost host([&](VPeer& peer) {
+        peer.ReadFrame();
+        peer.SendFrame(ServerInformationText());
+        rest = peer.ReadToEnd();
+    });
+    const std::string command = std::string(KORVA_CONTROL_PROGRAM) + " --port " +
+                                std::to_string(host.Port()) + " info <&- >&- 2>&-";
+
+    const int status = std::system(command.c_str()); // NOLINT: a shell, to have the redirection
+
+    EXPECT_EQ("", host.Finish());
+    EXPECT_EQ("", rest);
+    ASSERT_TRUE(WIFEXITED(status));
+    EXPECT_EQ(1, WEXITSTATUS(status));
+}
+
 TEST(ProgramRaw, WithoutReplyWaitsUntilTheHostHasReadTheFrame)
 {
     std::string received;
