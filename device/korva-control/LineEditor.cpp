@@ -312,6 +312,7 @@ std::optional<std::string> VLineEditor::ReadPlainLine()
                 return line.empty() ? std::nullopt : std::optional(line);
             }
             if (byte == '\n') {
+                line.erase(line.find_last_not_of('\r') + 1);
                 return line;
             }
             line += byte;

@@ -182,6 +182,14 @@ void VShell::PrintList(const char* key, const std::vector<std::string>& list)
 
 void VShell::PrintHelp()
 {
+    if (output.IsJson()) {
+        VJson words = VJson::array();
+        for (const VShellWord& word : ShellWordList()) {
+            words.push_back({{"usage", word.Usage}, {"help", word.Help}});
+        }
+        output.PrintJson({{"help", words}});
+        return;
+    }
     for (const VShellWord& word : ShellWordList()) {
         std::string usage = word.Usage;
         usage.resize(std::max<std::size_t>(usage.size() + 1, 32), ' ');

@@ -9,6 +9,12 @@ bool BeginsWith(const std::string& text, const std::string& start)
     return text.compare(0, start.size(), start) == 0;
 }
 
+/// Whether the byte there goes on with a character of UTF-8.
+bool IsInsideCharacter(const std::string& text, std::size_t position)
+{
+    return position < text.size() && (static_cast<unsigned char>(text[position]) & 0xC0U) == 0x80U;
+}
+
 void AddMatching(std::vector<VCandidate>& candidates, const std::vector<std::string>& names,
                  const std::string& start)
 {
@@ -86,6 +92,10 @@ std::string VShellNames::CommonStart(const std::vector<VCandidate>& candidates)
         const auto end =
             std::mismatch(start.begin(), start.end(), candidate.Word.begin(), candidate.Word.end());
         start.erase(end.first, start.end());
+    }
+    // No character is left in part.
+    while (!start.empty() && IsInsideCharacter(candidates.front().Word, start.size())) {
+        start.pop_back();
     }
     return start;
 }

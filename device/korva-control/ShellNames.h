@@ -38,7 +38,7 @@ public:
     /// any words there is nothing to go on with.
     std::vector<VCandidate> Complete(const std::vector<std::string>& words);
 
-    /// The longest text with which all candidates begin.
+    /// The longest text of whole characters with which all candidates begin.
     static std::string CommonStart(const std::vector<VCandidate>& candidates);
 
 private:

@@ -133,4 +133,11 @@ TEST(ShellNamesStart, IsWhatAllHaveInCommon)
     EXPECT_EQ("", VShellNames::CommonStart({{"a", true}, {"b", true}}));
 }
 
+TEST(ShellNamesStart, EndsWithAWholeCharacter)
+{
+    EXPECT_EQ("a", VShellNames::CommonStart({{"a\u00E9", true}, {"a\u00E8", true}}));
+    EXPECT_EQ("", VShellNames::CommonStart({{"\U0001F600", true}, {"\U0001F601", true}}));
+    EXPECT_EQ("\u00E9", VShellNames::CommonStart({{"\u00E9", true}, {"\u00E9x", true}}));
+}
+
 } // namespace

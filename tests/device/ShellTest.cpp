@@ -9,8 +9,10 @@
 
 #include <filesystem>
 #include <future>
+#include <sstream>
 
 #include <gmock/gmock.h>
+#include <nlohmann/json.hpp>
 
 namespace {
 
@@ -241,6 +243,42 @@ TEST_F(Shell, SpeaksJson)
             R"({"command":"Host.Echo","result":"OK","ok":true,"parameters":{"Text":"Hello"}})"
             "\n"
             R"({"name":"Host.Echo",)"));
+}
+
+TEST_F(Shell, SpeaksJsonAlsoOfItself)
+{
+    std::vector<std::string> arguments = ShellAt(host.Port());
+    arguments.insert(arguments.begin(), "--json");
+    VChildProgram program(arguments, "help\ninfo\nnonsense\n");
+
+    const VOutcome outcome = program.Finish();
+
+    std::istringstream lines(outcome.Output);
+    std::vector<nlohmann::json> objects;
+    for (std::string line; std::getline(lines, line);) {
+        objects.push_back(nlohmann::json::parse(line));
+    }
+    ASSERT_EQ(2U, objects.size()) << outcome.Output;
+    EXPECT_EQ("quit", objects[0]["help"].back()["usage"]);
+    EXPECT_TRUE(objects[1].contains("connected"));
+}
+
+TEST_F(Shell, EndsWhereItsInputWasClosed)
+{
+    const std::string command = std::string(KORVA_CONTROL_PROGRAM) + " --port " +
+                                std::to_string(host.Port()) + " shell --history '' <&- >/dev/null";
+
+    EXPECT_EQ(0, std::system(command.c_str())); // NOLINT: a shell, to have the redirection
+}
+
+TEST_F(Shell, TakesLinesThatEndAsOnOtherSystems)
+{
+    VChildProgram program(ShellAt(host.Port()), "run Host.Echo Text=Hello\r\nquit\r\n");
+
+    const VOutcome outcome = program.Finish();
+
+    EXPECT_THAT(outcome.Output, HasSubstr("OK\nText=Hello\n"));
+    EXPECT_EQ(0, outcome.ExitCode) << outcome.Errors;
 }
 
 TEST(ShellHost, GetsABeatEverySecond)
