@@ -5,37 +5,46 @@
 #include <unicode/utf8.h>
 
 #include <cstdint>
+#include <cstring>
 #include <type_traits>
 
 namespace KVR {
 
 namespace {
 
+constexpr std::size_t blockSize = 16;
+
+/// @return whether a whole block is ASCII, asked of eight bytes at a time
+template <typename VUnit>
+bool IsAsciiBlock(const VUnit* block)
+{
+    static_assert(sizeof(VUnit) == 1 || sizeof(VUnit) == 4);
+    constexpr std::uint64_t beyondAscii =
+        sizeof(VUnit) == 1 ? 0x8080808080808080 : 0xFFFFFF80FFFFFF80;
+    std::uint64_t all = 0;
+    for (std::size_t offset = 0; offset < blockSize * sizeof(VUnit); offset += sizeof all) {
+        std::uint64_t part = 0;
+        std::memcpy(&part, reinterpret_cast<const char*>(block) + offset, sizeof part);
+        all |= part;
+    }
+    return (all & beyondAscii) == 0;
+}
+
 /// Copies the ASCII at the beginning of a text, which is nearly all of every message: whole blocks,
 /// which the compiler turns into a few instructions each, and then what is left.
 ///
 /// @return how many units were copied
 template <typename From, typename To>
-std::size_t CopyAscii(const From* text, std::size_t size, To* target)
+std::size_t CopyAscii(const From* __restrict text, std::size_t size, To* __restrict target)
 {
     using VUnit = std::make_unsigned_t<From>;
-    constexpr std::size_t blockSize = 16;
-    constexpr VUnit firstBeyondAscii = 0x80;
-
     std::size_t done = 0;
-    for (; size - done >= blockSize; done += blockSize) {
-        VUnit all = 0;
-        for (std::size_t i = 0; i < blockSize; ++i) {
-            all |= static_cast<VUnit>(text[done + i]);
-        }
-        if (all >= firstBeyondAscii) {
-            break;
-        }
+    for (; size - done >= blockSize && IsAsciiBlock(text + done); done += blockSize) {
         for (std::size_t i = 0; i < blockSize; ++i) {
             target[done + i] = static_cast<To>(text[done + i]);
         }
     }
-    for (; done < size && static_cast<VUnit>(text[done]) < firstBeyondAscii; ++done) {
+    for (; done < size && static_cast<VUnit>(text[done]) < 0x80; ++done) {
         target[done] = static_cast<To>(text[done]);
     }
     return done;

@@ -6,7 +6,6 @@
 #include "QuorixPluginControlStreamServer/ControlSystem/IControlSystem.h"
 
 #include <boost/algorithm/string/replace.hpp>
-#include <boost/bind/bind.hpp>
 
 #include <string_view>
 #include <utility>
@@ -39,16 +38,27 @@ std::wstring BuildReply(const VRequest& request, std::int32_t code,
     return reply.Print();
 }
 
-void SendSuccess(const std::shared_ptr<const VRequest>& request,
-                 const ControlSystem::IParameters& parameters)
+/// Answers a command that succeeded.
+struct VSendSuccess
 {
-    request->Connection->Send(BuildReply(*request, Success, parameters));
-}
+    std::shared_ptr<const VRequest> Request;
 
-void SendFailure(const std::shared_ptr<const VRequest>& request, ControlSystem::IResult result)
+    void operator()(const ControlSystem::IParameters& parameters) const
+    {
+        Request->Connection->Send(BuildReply(*Request, Success, parameters));
+    }
+};
+
+/// Answers a command that failed.
+struct VSendFailure
 {
-    request->Connection->Send(BuildReply(*request, result.Code, ControlSystem::IParameters()));
-}
+    std::shared_ptr<const VRequest> Request;
+
+    void operator()(ControlSystem::IResult result) const
+    {
+        Request->Connection->Send(BuildReply(*Request, result.Code, ControlSystem::IParameters()));
+    }
+};
 
 /// Decodes the five entities. The ampersand comes last, so that "&amp;lt;" ends up as "&lt;".
 void DecodeEntities(std::wstring& value)
@@ -89,10 +99,8 @@ bool VMessageParserExecuteCommand::Answer(const std::shared_ptr<IClientConnectio
         return false;
     }
 
-    const std::shared_ptr<const VRequest> answered = request;
-    controlSystem->ExecuteCommand(request->Name, parameters,
-                                  boost::bind(&SendSuccess, answered, boost::placeholders::_1),
-                                  boost::bind(&SendFailure, answered, boost::placeholders::_1));
+    controlSystem->ExecuteCommand(request->Name, parameters, VSendSuccess{request},
+                                  VSendFailure{request});
     return true;
 }
 

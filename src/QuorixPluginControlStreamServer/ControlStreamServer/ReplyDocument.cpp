@@ -19,56 +19,50 @@ namespace {
 class VTextCollector
 {
 public:
-    wchar_t* Begin() { return room.data(); }
-    const wchar_t* End() const { return room.data() + room.size(); }
-
-    /// Moves on what stands before a place. @return where the next character goes
-    wchar_t* MoveOn(const wchar_t* place)
+    void Put(wchar_t character)
     {
-        text.append(room.data(), static_cast<std::size_t>(place - room.data()));
-        return room.data();
+        if (used == room.size()) {
+            MoveOn();
+        }
+        room[used++] = character;
     }
 
-    /// Returns the whole text, which ends at a place. Called once, at the end.
-    std::wstring Take(const wchar_t* place)
+    /// Returns the whole text. Called once, at the end.
+    std::wstring Take()
     {
-        MoveOn(place);
+        MoveOn();
         return std::move(text);
     }
 
 private:
+    void MoveOn()
+    {
+        text.append(room.data(), used);
+        used = 0;
+    }
+
     std::array<wchar_t, 1024> room; // not cleared: only what was put there is read
+    std::size_t used = 0;
     std::wstring text;
 };
 
-/// The form in which RapidXml wants to write: every assignment puts one character. RapidXml hands
-/// its writer on from function to function, so that the place can stay in a register.
+/// The form in which RapidXml wants to write: every assignment puts one character.
 class VTextWriter
 {
 public:
-    explicit VTextWriter(VTextCollector& collector)
-        : collector(&collector), place(collector.Begin()), end(collector.End())
-    {
-    }
+    explicit VTextWriter(VTextCollector& collector) : collector(&collector) {}
 
     VTextWriter& operator*() { return *this; }
     VTextWriter& operator++() { return *this; }
-    VTextWriter& operator++(int) { return *this; } // not a copy, which would put the character
+    VTextWriter operator++(int) { return *this; }
     VTextWriter& operator=(wchar_t character)
     {
-        if (place == end) {
-            place = collector->MoveOn(place);
-        }
-        *place++ = character;
+        collector->Put(character);
         return *this;
     }
 
-    const wchar_t* Place() const { return place; }
-
 private:
     VTextCollector* collector;
-    wchar_t* place;
-    const wchar_t* end;
 };
 
 } // namespace
@@ -112,9 +106,8 @@ void VReplyDocument::AddParameters(VElement& parent, const ControlSystem::IParam
 std::wstring VReplyDocument::Print() const
 {
     VTextCollector collector;
-    const VTextWriter end =
-        rapidxml::print(VTextWriter(collector), document, rapidxml::print_no_indenting);
-    return collector.Take(end.Place());
+    rapidxml::print(VTextWriter(collector), document, rapidxml::print_no_indenting);
+    return collector.Take();
 }
 
 void VReplyDocument::AddAttribute(VElement& element, std::wstring_view name,
