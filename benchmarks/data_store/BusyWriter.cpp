@@ -1,6 +1,6 @@
 #include "BusyWriter.h"
 
-#include "Comparison.h"
+#include "comparison/Comparison.h"
 
 #include "QuorixDataStore/DataReader.h"
 #include "QuorixDataStore/DataWriter.h"
@@ -182,9 +182,7 @@ nlohmann::json CompareBesideBusyWriter(VItems& items, VDataStore& store, VMapSto
     return {{"own", Describe(own)},
             {"limit", Describe(limit)},
             {"ratio", MedianOf(ratios)},
-            {"ratio_range",
-             {*std::min_element(ratios.begin(), ratios.end()),
-              *std::max_element(ratios.begin(), ratios.end())}},
+            {"ratio_range", RangeOf(ratios)},
             {"aim", 0.5},
             {"aim_met", MedianOf(ratios) <= 0.5}};
 }

@@ -2,10 +2,10 @@
 // in the same run. Standard output gets one JSON object.
 
 #include "BusyWriter.h"
-#include "Comparison.h"
 #include "Items.h"
 #include "LmdbStore.h"
 #include "MapStore.h"
+#include "comparison/Comparison.h"
 
 #include "QuorixDataStore/DataListeners.h"
 #include "QuorixDataStore/DataReader.h"

@@ -1,9 +1,9 @@
 // Measures the loading and the saving of configuration files beside the bare parsing and printing
 // of the same document.
 
-#include "../io/Comparison.h"
 #include "Document.h"
 #include "QuorixDataStore/DataStore.h"
+#include "comparison/Comparison.h"
 
 #include <CLI/CLI.hpp>
 #include <nlohmann/json.hpp>
@@ -48,16 +48,6 @@ double PeakOf(const std::function<void()>& work)
     return MemoryFigure("VmHWM:") - before;
 }
 
-/// Compares and adds what one item costs.
-nlohmann::json PerItem(unsigned rounds, std::size_t count, const std::function<void()>& own,
-                       const std::function<void()>& limit, double aim)
-{
-    nlohmann::json result = Compare(rounds, own, limit, aim);
-    const double own_ms = result.at("own_ms").get<double>();
-    result["own_ns_per_item"] = own_ms * 1e6 / static_cast<double>(count);
-    return result;
-}
-
 nlohmann::json Measure(unsigned rounds, std::size_t count)
 {
     VDataStore store;
@@ -67,14 +57,15 @@ nlohmann::json Measure(unsigned rounds, std::size_t count)
     Require(SaveStore(store, false) == text, "both sides print the same");
     Require(SaveStore(*LoadStore(text), false) == text, "what is loaded prints the same");
 
+    const auto items = static_cast<double>(count);
     nlohmann::json report;
     report["file_bytes"] = text.size();
-    report["load"] = PerItem(
-        rounds, count, [&] { LoadStore(text); }, [&] { ParseAndWalk(text); }, 30);
-    report["save"] = PerItem(
-        rounds, count, [&] { SaveStore(store, false); }, [&] { BuildAndPrint(texts); }, 3);
-    report["save_with_pending_change"] = PerItem(
-        rounds, count, [&] { SaveStore(store, true); }, [&] { BuildAndPrint(texts); }, 3);
+    report["load"] = Compare(
+        rounds, items, [&] { LoadStore(text); }, [&] { ParseAndWalk(text); }, 30);
+    report["save"] = Compare(
+        rounds, items, [&] { SaveStore(store, false); }, [&] { BuildAndPrint(texts); }, 3);
+    report["save_with_pending_change"] = Compare(
+        rounds, items, [&] { SaveStore(store, true); }, [&] { BuildAndPrint(texts); }, 3);
     report["peak_mib"] = {
         {"load", PeakOf([&] { LoadStore(text); })},
         {"bare_parse", PeakOf([&] { ParseAndWalk(text); })},

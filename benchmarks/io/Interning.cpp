@@ -1,7 +1,7 @@
 #include "Interning.h"
 
-#include "Comparison.h"
 #include "Variant/Interning.h"
+#include "comparison/Comparison.h"
 
 #include <algorithm>
 #include <atomic>
@@ -106,9 +106,7 @@ nlohmann::json CompareThreads(unsigned rounds, unsigned calls, const LookUp& loo
         {"one_thread_per_second", MedianOf(one)},
         {"two_threads_per_second", MedianOf(two)},
         {"ratio", MedianOf(ratios)},
-        {"ratio_range",
-         {*std::min_element(ratios.begin(), ratios.end()),
-          *std::max_element(ratios.begin(), ratios.end())}},
+        {"ratio_range", RangeOf(ratios)},
     };
 }
 

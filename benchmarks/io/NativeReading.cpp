@@ -1,6 +1,6 @@
 #include "NativeReading.h"
 
-#include "Comparison.h"
+#include "comparison/Comparison.h"
 #include "io/NativeTypes.h"
 
 #include <array>
@@ -112,7 +112,7 @@ nlohmann::json BesideCopy(unsigned rounds, const T& object)
 
     ByteVector copy(bytes.size());
     return Compare(
-        rounds, [&] { Require(reader.Read(bytes, *read), "the object was not read"); },
+        rounds, 1, [&] { Require(reader.Read(bytes, *read), "the object was not read"); },
         [&] {
             std::memcpy(copy.data(), bytes.data(), bytes.size());
             Require(std::memcmp(copy.data(), bytes.data(), 1) == 0, "the bytes were not copied");
@@ -144,7 +144,7 @@ nlohmann::json BesideCurrent(unsigned rounds, std::size_t count)
     Require(evolving.Read(bytes, read) && BytesOf(read) == bytes, "the records were not read");
 
     return Compare(
-        rounds, [&] { Require(evolving.Read(bytes, read), "the records were not read"); },
+        rounds, 1, [&] { Require(evolving.Read(bytes, read), "the records were not read"); },
         [&] { Require(current.Read(bytes, limitRead), "the records were not read"); },
         mostBesideCurrent);
 }

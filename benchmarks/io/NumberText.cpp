@@ -1,6 +1,6 @@
 #include "NumberText.h"
 
-#include "Comparison.h"
+#include "comparison/Comparison.h"
 #include "io/ISchema.h"
 #include "io/ValueText.h"
 
@@ -123,7 +123,7 @@ public:
     {
         const auto beside = [&](Work own, Work limit, std::optional<double> aim) {
             const auto run = [this](Work work) { return [this, work] { (this->*work)(); }; };
-            return Compare(rounds, run(own), run(limit), aim);
+            return Compare(rounds, 1, run(own), run(limit), aim);
         };
         const auto write = &VListText::Write;
         const auto read = &VListText::Read;

@@ -1,4 +1,4 @@
-#include "Comparison.h"
+#include "comparison/Comparison.h"
 
 #include <algorithm>
 #include <chrono>
@@ -36,7 +36,13 @@ double MedianOf(std::vector<double> numbers)
     return *middle;
 }
 
-nlohmann::json Compare(unsigned rounds, const std::function<void()>& own,
+nlohmann::json RangeOf(const std::vector<double>& ratios)
+{
+    const auto [least, greatest] = std::minmax_element(ratios.begin(), ratios.end());
+    return {*least, *greatest};
+}
+
+nlohmann::json Compare(unsigned rounds, double operations, const std::function<void()>& own,
                        const std::function<void()>& limit, std::optional<double> aim)
 {
     own(); // the first of each finds cold caches and grows its buffers
@@ -45,9 +51,9 @@ nlohmann::json Compare(unsigned rounds, const std::function<void()>& own,
     std::vector<double> ownTimes;
     std::vector<double> limitTimes;
     std::vector<double> ratios;
-    for (unsigned i = 0; i < rounds; ++i) {
+    for (unsigned round = 0; round < rounds; ++round) {
         // Who goes first changes, or the second would always find what the first has warmed.
-        const bool ownFirst = i % 2 == 0;
+        const bool ownFirst = round % 2 == 0;
         const double first = ProcessorSecondsOf(ownFirst ? own : limit);
         const double second = ProcessorSecondsOf(ownFirst ? limit : own);
         ownTimes.push_back(ownFirst ? first : second);
@@ -56,15 +62,14 @@ nlohmann::json Compare(unsigned rounds, const std::function<void()>& own,
     }
 
     nlohmann::json result = {
-        {"own_ms", MedianOf(ownTimes) * 1e3},
-        {"limit_ms", MedianOf(limitTimes) * 1e3},
+        {"own_ns", MedianOf(ownTimes) * 1e9 / operations},
+        {"limit_ns", MedianOf(limitTimes) * 1e9 / operations},
         {"ratio", MedianOf(ratios)},
-        {"ratio_range",
-         {*std::min_element(ratios.begin(), ratios.end()),
-          *std::max_element(ratios.begin(), ratios.end())}},
+        {"ratio_range", RangeOf(ratios)},
     };
     if (aim) {
         result["aim"] = *aim;
+        result["aim_met"] = result["ratio"].get<double>() <= *aim;
     }
     return result;
 }
