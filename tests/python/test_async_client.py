@@ -35,6 +35,12 @@ class Connecting(unittest.IsolatedAsyncioTestCase):
             f"no connection to 127.0.0.1:{port}: Connection refused", str(caught.exception)
         )
 
+    async def test_says_that_no_computer_can_have_the_name(self) -> None:
+        for name in ("a..b", "a" * 300, "\udcff"):
+            with self.subTest(name=name), self.assertRaises(NoConnectionError) as caught:
+                await AsyncClient().connect(name)
+            self.assertIn(f"no connection to {name}:803: ", str(caught.exception))
+
     async def test_says_that_the_host_does_not_answer(self) -> None:
         with ScriptedHost(Peer.wait_for_end) as host:
             with self.assertRaises(TimedOutError) as caught:

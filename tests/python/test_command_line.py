@@ -107,6 +107,7 @@ class CommandLine(unittest.TestCase):
                 code, output, errors = run(*words)
                 self.assertEqual((2, ""), (code, output))
                 self.assertNotEqual("", errors)
+                self.assertNotIn("invalid _", errors)  # the name of a function of ours
 
     def test_no_connection_ends_with_3_and_silence_with_4(self) -> None:
         self.assertEqual(
@@ -132,6 +133,32 @@ class CommandLine(unittest.TestCase):
             done = subprocess.run(words, stdout=writing, stderr=subprocess.PIPE, timeout=LIMIT)
         os.close(writing)
         self.assertEqual((1, b""), (done.returncode, done.stderr))
+
+    @unittest.skipUnless(os.path.exists("/dev/full"), "needs an output that takes nothing")
+    def test_output_that_takes_nothing_is_told(self) -> None:
+        with ScriptedHost(lambda peer: (peer.greet(), peer.greet())) as host:
+            words = [sys.executable, "-m", "korva_control", "--port", str(host.port), "info"]
+            with open("/dev/full", "wb") as full:
+                done = subprocess.run(words, stdout=full, stderr=subprocess.PIPE, timeout=LIMIT)
+        text = b"korva_control: the output cannot be written: No space left on device\n"
+        self.assertEqual((1, text), (done.returncode, done.stderr))
+
+    def test_json_stays_json_where_the_output_has_no_utf_8(self) -> None:
+        def script(peer: Peer) -> None:
+            peer.greet()
+            peer.reply(peer.read(), parameters=parameter("p", "é😀"))
+
+        for encoding in ("ascii", "latin-1", "utf-8"):
+            with self.subTest(encoding=encoding), ScriptedHost(script) as host:
+                where = ["--json", "--port", str(host.port)]
+                output = subprocess.run(
+                    [sys.executable, "-m", "korva_control", *where, "run", "A"],
+                    stdout=subprocess.PIPE,
+                    timeout=LIMIT,
+                    env={**os.environ, "PYTHONIOENCODING": encoding},
+                    check=True,
+                ).stdout
+                self.assertEqual({"p": "é😀"}, json.loads(output.decode(encoding))["parameters"])
 
     def test_a_terminal_without_utf_8_gets_what_it_can_show(self) -> None:
         def script(peer: Peer) -> None:

@@ -58,6 +58,8 @@ def main() -> int:
     parser.add_argument("--steps", type=int, default=10)
     parser.add_argument("--authorize", metavar="ID", help="ask to be let in first, under this id")
     arguments = parser.parse_args()
+    if arguments.steps < 1:
+        parser.error("a ramp has one step or more")
     try:
         with Client() as client:
             client.connect(arguments.host, arguments.port)

@@ -99,6 +99,8 @@ class AsyncClient:
             raise TimedOutError(f"timed out after {limit:g} s, connecting to {where}") from None
         except OSError as error:
             raise NoConnectionError(f"no connection to {where}: {reason_of(error)}") from None
+        except UnicodeError as error:  # from the look-up: it is no name that a computer can have
+            raise NoConnectionError(f"no connection to {where}: {error}") from None
         try:
             await self._greet(link, limit, max(end - loop.time(), 0.001))
         except BaseException as error:

@@ -3,6 +3,7 @@
 from __future__ import annotations
 
 import argparse
+import contextlib
 import io
 import json
 import os
@@ -19,6 +20,7 @@ from .errors import (
     TimedOutError,
     UsageError,
 )
+from .link import reason_of
 from .options import ClientOptions
 from .records import DEFAULT_PORT, Event
 from .terminal import for_terminal, word_for_terminal
@@ -34,24 +36,24 @@ _EPILOG = """Exit codes:
 
 
 def _seconds(text: str) -> float:
-    value = float(text)
-    if not 0 < value <= 365 * 24 * 3600:
-        raise ValueError(text)
-    return value
+    with contextlib.suppress(ValueError):
+        if 0 < float(text) <= 365 * 24 * 3600:
+            return float(text)
+    raise argparse.ArgumentTypeError(f"'{text}' is no number of seconds above 0")
 
 
 def _port(text: str) -> int:
-    value = int(text)
-    if not 0 < value < 65536:
-        raise ValueError(text)
-    return value
+    with contextlib.suppress(ValueError):
+        if 0 < int(text) < 65536:
+            return int(text)
+    raise argparse.ArgumentTypeError(f"'{text}' is no port from 1 to 65535")
 
 
 def _count(text: str) -> int:
-    value = int(text)
-    if value <= 0:
-        raise ValueError(text)
-    return value
+    with contextlib.suppress(ValueError):
+        if int(text) > 0:
+            return int(text)
+    raise argparse.ArgumentTypeError(f"'{text}' is no whole number above 0")
 
 
 def _common_options() -> argparse.ArgumentParser:
@@ -114,7 +116,12 @@ def _print(line: str) -> None:
 
 
 def _print_json(content: Dict[str, object]) -> None:
-    _print(json.dumps(content, ensure_ascii=False))
+    text = json.dumps(content, ensure_ascii=False)
+    try:
+        text.encode(getattr(sys.stdout, "encoding", None) or "utf-8")
+    except UnicodeError:
+        text = json.dumps(content)  # what stands for a character elsewhere would be no JSON
+    _print(text)
 
 
 class _Program:
@@ -238,7 +245,10 @@ def main(words: Optional[Sequence[str]] = None) -> int:
     except ControlError as error:
         print(f"korva_control: {for_terminal(str(error))}", file=sys.stderr)
         return _exit_code(error)
-    except BrokenPipeError:
-        # Whoever read the output has gone. What Python would still flush has nobody to go to.
+    except OSError as error:
+        # What Python would still flush has nowhere to go.
         os.dup2(os.open(os.devnull, os.O_WRONLY), sys.stdout.fileno())
+        if not isinstance(error, BrokenPipeError):  # else whoever read the output has gone
+            reason = reason_of(error)
+            print(f"korva_control: the output cannot be written: {reason}", file=sys.stderr)
         return HOST_FAILED
