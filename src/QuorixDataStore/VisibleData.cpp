@@ -20,8 +20,10 @@ VDataPath LeadingNames(const VDataPath& path)
 
 } // namespace
 
-bool VVisibleData::FindTokens(const VDataPath& path, std::vector<VDataToken>& tokens) const
+bool VVisibleData::FindTokens(const VDataPath& wanted, std::vector<VDataToken>& tokens) const
 {
+    // The path may be that of a token in the list.
+    const VDataPath path(wanted); // NOLINT(performance-unnecessary-copy-initialization)
     tokens.clear();
     const bool pending = !delta.Empty(); // else another thread's changes may hang on the nodes
     committed.ForEachItem(path, [&](const VDataItem& item) {

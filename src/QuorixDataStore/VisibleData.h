@@ -20,7 +20,7 @@ public:
     {
     }
 
-    bool FindTokens(const VDataPath& path, std::vector<VDataToken>& tokens) const;
+    bool FindTokens(const VDataPath& wanted, std::vector<VDataToken>& tokens) const;
     std::uint64_t GetChildCount(const VDataPath& path) const;
     bool HasChild(const VDataPath& path, const std::string& name) const;
     bool GetChildren(const VDataPath& path, std::vector<std::string>& names) const;

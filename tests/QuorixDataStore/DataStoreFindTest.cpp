@@ -26,6 +26,17 @@ TEST_F(DataStore, FindTokensByNamesAndWildcards)
     EXPECT_EQ((Texts{}), Find(reader, ""));
 }
 
+TEST_F(DataStore, FindTokensOfAPathInItsOwnList)
+{
+    SetItems({"A.B", "C"});
+    const VDataReader reader(store);
+    std::vector<VDataToken> tokens{VDataToken(VDataPath{"A", "B"})};
+
+    EXPECT_TRUE(reader.FindTokens(tokens[0].GetPath(), tokens));
+
+    EXPECT_EQ((Texts{"A.B"}), PathsOf(tokens));
+}
+
 TEST_F(DataStore, FindTokensListsPendingAfterCommittedItems)
 {
     SetItems({"A.B", "A.D"});
