@@ -254,6 +254,22 @@ TEST(CallbackPostal, CanBeSetAgainAfterItsTargetDied)
     EXPECT_EQ(1, calls);
 }
 
+TEST(CallbackPostal, ACallPostedBeforeTheTargetWasFoundDeadRunsNothingThatWasSetSince)
+{
+    const auto service = std::make_shared<VManualPostalService>();
+    VCallbackPostal<void()> callback(service);
+    callback.Set([] { throw KVR::VDeregisterWeakCallbackException(); });
+    callback();
+    callback();
+    service->Queue.front()(); // finds it dead
+    service->Queue.pop_front();
+
+    EXPECT_FALSE(callback()); // drops the emptied place
+    callback.Set([] { FAIL() << "called for a call before it was set"; });
+
+    EXPECT_EQ(1, service->Deliver());
+}
+
 TEST(CallbackPostal, LetsOtherExceptionsOfADirectCallPass)
 {
     VCallbackPostal<void()> callback;
