@@ -44,9 +44,12 @@ Item {
             bottom: checkRemember.top
             margins: Theme.margin
         }
-        text: "Control on '" + authorizationDialog.clientName + "' is requesting a connection."
-        // The name is a device's: no markup in it is ever rendered.
+        // The name is a device's: no markup in it is ever rendered, marks piled upon a character stay
+        // within the label, and one of a megabyte is cut, as its layout would take minutes.
+        text: "Control on '" + authorizationDialog.clientName.substring(0, 500)
+              + "' is requesting a connection."
         textFormat: Text.PlainText
+        clip: true
         color: Theme.text
         horizontalAlignment: Text.AlignLeft
         wrapMode: Text.Wrap

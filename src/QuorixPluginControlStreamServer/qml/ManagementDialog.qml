@@ -1,4 +1,4 @@
-import QtQuick 2.0
+import QtQuick 2.1
 import QtQuick.Layouts 1.0
 import QtQuick.Controls 2.2
 import QuorixQML 1.0
@@ -58,9 +58,28 @@ Item {
         ListView {
             id: list
             objectName: "list"
+
+            // What the keyboard does in place of a row's own button, which only the mouse brings up.
+            function forgetCurrentRow(event) {
+                if (event.isAutoRepeat) {
+                    return
+                }
+                managementModel.forgetItem(currentIndex)
+                if (count === 0) {
+                    // The focus would go with the last row. Here one more key does no harm.
+                    resetButton.forceActiveFocus(Qt.TabFocusReason)
+                }
+            }
+
             spacing: Theme.margin
             model: managementModel
             delegate: controlDelegate
+            activeFocusOnTab: count > 0
+
+            Keys.onSpacePressed: forgetCurrentRow(event)
+            Keys.onReturnPressed: forgetCurrentRow(event)
+            Keys.onEnterPressed: forgetCurrentRow(event)
+            Keys.onDeletePressed: forgetCurrentRow(event)
 
             add: Transition {
                 NumberAnimation {
@@ -181,9 +200,12 @@ Item {
                     margins: Theme.margin
                     verticalCenter: parent.verticalCenter
                 }
-                text: itemName
-                // The name is a device's: no markup in it is ever rendered.
+                // The name is a device's: no markup in it is ever rendered, marks piled upon a
+                // character stay within the label, and one of a megabyte is cut, as its layout would
+                // take minutes.
+                text: itemName.substring(0, 500)
                 textFormat: Text.PlainText
+                clip: true
                 color: Theme.text
                 horizontalAlignment: Text.AlignLeft
                 maximumLineCount: 1
@@ -198,7 +220,8 @@ Item {
                     rightMargin: Theme.margin
                     verticalCenter: parent.verticalCenter
                 }
-                // Nobody can see it while the mouse is elsewhere, so the keyboard passes it by.
+                // Nobody can see it while the mouse is elsewhere, so the keyboard passes it by and
+                // works with the row instead.
                 focusPolicy: Qt.NoFocus
                 opacity: itemMouseArea.containsMouse || hovered ? 1.0 : 0.0
                 text: "Forget"
@@ -206,6 +229,24 @@ Item {
 
                 Behavior on opacity {
                     NumberAnimation { duration: 300 }
+                }
+            }
+
+            // Stands where the button comes up, in the row whose device the keyboard would forget.
+            Rectangle {
+                id: keyboardFocus
+                objectName: "keyboardFocus"
+                anchors.fill: forgetButton
+                visible: list.activeFocus && rect.ListView.isCurrentItem
+                color: "transparent"
+                radius: 3
+                border { width: 2; color: Theme.text }
+
+                Text {
+                    anchors.centerIn: parent
+                    text: forgetButton.text
+                    color: Theme.text
+                    opacity: 1.0 - forgetButton.opacity
                 }
             }
         }

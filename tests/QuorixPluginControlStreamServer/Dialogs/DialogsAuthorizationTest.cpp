@@ -144,6 +144,19 @@ TEST_F(AuthorizationDialog, RendersNoMarkupInAName)
               label.property("text"));
 }
 
+TEST_F(AuthorizationDialog, CutsANameThatNobodyWouldReadToItsEnd)
+{
+    const QString name(1000, 'a');
+    const std::unique_ptr<VDialog> dialog(Make(name));
+
+    const QQuickItem& label = ItemOf(*dialog, "label");
+
+    EXPECT_EQ("Control on '" + name.left(500) + "' is requesting a connection.",
+              label.property("text").toString());
+    EXPECT_TRUE(label.clip());
+    EXPECT_EQ(name, dialog->property("clientName").toString());
+}
+
 TEST_F(AuthorizationDialog, OpensItsCheckBoxAsItIsTold)
 {
     const std::unique_ptr<VDialog> ticked(Make("Tablet", true));

@@ -39,6 +39,14 @@ const std::string longName = [] {
     return name;
 }();
 
+const std::string piledName = [] {
+    std::string name = "a";
+    for (int i = 0; i < 400; ++i) {
+        name += "\u0301"; // an accent
+    }
+    return name;
+}();
+
 // clang-format off
 const VLayoutCase layoutCases[] = {
     {"light",              false, "Tablet of the second unit"},
@@ -49,6 +57,7 @@ const VLayoutCase layoutCases[] = {
     {"light-right-to-left", false, rightToLeftName},
     {"dark-right-to-left", true,  rightToLeftName},
     {"light-no-name",      false, ""},
+    {"light-piled-marks",  false, piledName},
     {"light-lines",        false, "one\ntwo\nthree\nfour\nfive\nsix\nseven\neight\nnine"},
 };
 // clang-format on
@@ -226,6 +235,18 @@ TEST_P(ManagementLayout, ShowsARowForEachDevice)
         EXPECT_EQ(PlaceOf(ItemOf(*row, "imageControl")), PlaceOf(ItemOf(*row, "imageAllowed")));
         EXPECT_EQ(PlaceOf(ItemOf(*row, "imageControl")), PlaceOf(ItemOf(*row, "imageBanned")));
     }
+}
+
+TEST_P(ManagementLayout, MarksTheRowOfTheKeyboardWhereItsButtonComesUp)
+{
+    const auto dialog = Open(SomeDevices(), "some");
+    ItemOf(*dialog, "list").forceActiveFocus();
+    KeepPicture(*dialog, std::string("management-keyboard") + (GetParam() ? "-dark" : "-light"));
+
+    QQuickItem& first = *ItemsOf(ItemOf(*dialog, "list"), "rect").front();
+
+    EXPECT_TRUE(ItemOf(first, "keyboardFocus").isVisible());
+    EXPECT_EQ(PlaceOf(ItemOf(first, "forgetButton")), PlaceOf(ItemOf(first, "keyboardFocus")));
 }
 
 TEST_P(ManagementLayout, ScrollsAFullListAndNeverSideways)

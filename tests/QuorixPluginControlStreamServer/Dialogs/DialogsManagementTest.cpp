@@ -223,6 +223,100 @@ TEST_F(ManagementDialog, ForgetsEverythingByResetAndOk)
     EXPECT_EQ(MakeStringValue(""), Preference(ControlPreferences::BannedControls()));
 }
 
+TEST_F(ManagementDialog, IsWorkedByTheKeyboardAlone)
+{
+    const VDialog& opened = Open();
+    VQuickWidget& view = TestSupport::ViewOf(opened);
+
+    for (const char* const stop : {"resetButton", "list", "buttonOk", "buttonCancel"}) {
+        QTest::keyClick(&view, Qt::Key_Tab);
+        EXPECT_TRUE(ItemOf(opened, stop).hasActiveFocus()) << stop;
+    }
+    for (const char* const stop : {"buttonOk", "list", "resetButton"}) {
+        QTest::keyClick(&view, Qt::Key_Backtab);
+        EXPECT_TRUE(ItemOf(opened, stop).hasActiveFocus()) << stop;
+    }
+}
+
+TEST_F(ManagementDialog, MarksTheRowThatTheKeyboardWouldForget)
+{
+    const VDialog& opened = Open();
+    VQuickWidget& view = TestSupport::ViewOf(opened);
+    const QQuickItem& alto = ItemOf(RowOf(opened, "Alto"), "keyboardFocus");
+    const QQuickItem& bass = ItemOf(RowOf(opened, "Bass"), "keyboardFocus");
+    EXPECT_FALSE(alto.isVisible());
+
+    ItemOf(opened, "list").forceActiveFocus();
+    EXPECT_TRUE(alto.isVisible());
+    EXPECT_FALSE(bass.isVisible());
+    QTest::keyClick(&view, Qt::Key_Down);
+    EXPECT_FALSE(alto.isVisible());
+    EXPECT_TRUE(bass.isVisible());
+
+    // Only the mouse brings the button itself up.
+    EXPECT_EQ(0.0, ItemOf(RowOf(opened, "Bass"), "forgetButton").opacity());
+}
+
+TEST_F(ManagementDialog, ForgetsByTheKeyboardToo)
+{
+    for (const Qt::Key key : {Qt::Key_Space, Qt::Key_Return, Qt::Key_Enter, Qt::Key_Delete}) {
+        authorization->SetDevices(twoDevices);
+        const VDialog& opened = Open();
+        VQuickWidget& view = TestSupport::ViewOf(opened);
+        ItemOf(opened, "list").forceActiveFocus();
+
+        QTest::keyClick(&view, Qt::Key_Down);
+        QTest::keyClick(&view, key);
+        EXPECT_EQ(1, RowCount(opened));
+        EXPECT_TRUE(TestSupport::WaitFor(
+            [&] { return ItemOf(RowOf(opened, "Alto"), "keyboardFocus").isVisible(); }));
+        Click(opened, "buttonOk");
+
+        EXPECT_TRUE(IsGone(dialog));
+        EXPECT_EQ((VControlDevices{{"1", {true, "Alto"}}}), authorization->GetDevices());
+    }
+}
+
+TEST_F(ManagementDialog, ForgetsOneDeviceForAKeyThatIsHeld)
+{
+    const VDialog& opened = Open();
+    ItemOf(opened, "list").forceActiveFocus();
+    QTest::keyPress(&TestSupport::ViewOf(opened), Qt::Key_Delete);
+
+    QKeyEvent repeated(QEvent::KeyPress, Qt::Key_Delete, Qt::NoModifier, QString(), true);
+    QCoreApplication::sendEvent(&TestSupport::ViewOf(opened), &repeated);
+
+    EXPECT_EQ(1, RowCount(opened));
+}
+
+TEST_F(ManagementDialog, LeavesTheListWithItsLastRow)
+{
+    const VDialog& opened = Open();
+    VQuickWidget& view = TestSupport::ViewOf(opened);
+    ItemOf(opened, "list").forceActiveFocus();
+    for (int i = 0; i < 3; ++i) {
+        QTest::keyClick(&view, Qt::Key_Space);
+    }
+
+    EXPECT_EQ(0, RowCount(opened));
+    EXPECT_TRUE(opened.isVisible());
+    EXPECT_TRUE(ItemOf(opened, "resetButton").hasActiveFocus());
+}
+
+TEST_F(ManagementDialog, CutsANameThatNobodyWouldReadToItsEnd)
+{
+    const std::string name(1000, 'a');
+    authorization->SetDevices({{"1", {true, name}}});
+    const VDialog& opened = Open();
+
+    const QQuickItem& label =
+        ItemOf(RowOf(opened, QString::fromStdString(name).left(500)), "label");
+
+    EXPECT_TRUE(label.clip());
+    Click(opened, "buttonOk");
+    EXPECT_EQ((VControlDevices{{"1", {true, name}}}), authorization->GetDevices());
+}
+
 TEST_F(ManagementDialog, IgnoresAClickOnARowThatIsOnItsWayOut)
 {
     const VDialog& opened = Open();
