@@ -8,6 +8,7 @@
 #include "io/ValueText.h"
 #include "io/Values.h"
 #include "window/GreyscaleNames.h"
+#include "window/ShownText.h"
 
 #include <QFont>
 
@@ -139,10 +140,10 @@ QVariant VCameraModel::data(const QModelIndex& index, int role) const
     const VCell& cell = row.Cells[static_cast<std::size_t>(index.column())];
     switch (role) {
     case Qt::DisplayRole:
-        return TextOf(row, index.column());
+        return ShownLine(TextOf(row, index.column()));
     case Qt::EditRole:
         return IsEnum(cell.Value) ? QVariant(static_cast<int>(ReadUInt32OrZero(cell.Value)))
-                                  : TextOf(row, index.column());
+                                  : QVariant(TextOf(row, index.column()));
     case Qt::CheckStateRole:
         return index.column() == ColumnSelected
                    ? QVariant(row.IsSelected ? Qt::Checked : Qt::Unchecked)
@@ -166,13 +167,13 @@ bool VCameraModel::HasRow(const QModelIndex& index) const
     return index.isValid() && index.row() < rowCount();
 }
 
-QVariant VCameraModel::TextOf(const VRow& row, int column) const
+QString VCameraModel::TextOf(const VRow& row, int column) const
 {
     if (column == ColumnId) {
         return QString::fromStdString(CameraId(row.Number));
     }
     const VCell& cell = row.Cells[static_cast<std::size_t>(column)];
-    return cell.Parameter ? QVariant(ShownText(cell.Value)) : QVariant();
+    return cell.Parameter ? ShownText(cell.Value) : QString();
 }
 
 QString VCameraModel::TipOf(const VCell& cell) const
@@ -180,8 +181,9 @@ QString VCameraModel::TipOf(const VCell& cell) const
     if (!cell.Parameter || !cell.IsPending()) {
         return QString();
     }
-    return tr("Asked for %1; the camera still has %2")
-        .arg(ShownText(cell.Value), ShownText(cell.Verified));
+    return ShownTip(
+        tr("Asked for %1; the camera still has %2")
+            .arg(ShownLine(ShownText(cell.Value)), ShownLine(ShownText(cell.Verified))));
 }
 
 Qt::ItemFlags VCameraModel::flags(const QModelIndex& index) const

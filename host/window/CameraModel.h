@@ -89,7 +89,7 @@ private:
     VRow MakeRow(std::uint32_t number) const;
     static bool ReadRow(const IDataVerifyReader& reader, VRow& row);
     void MatchRows(const std::vector<std::uint32_t>& numbers);
-    QVariant TextOf(const VRow& row, int column) const;
+    QString TextOf(const VRow& row, int column) const;
     QString TipOf(const VCell& cell) const;
     bool SetText(const VCell& cell, const QVariant& value);
     bool SetSelected(const VRow& row, bool selected);

@@ -5,6 +5,7 @@
 #include "QuorixDataStore/DataReader.h"
 #include "QuorixDataStore/DataStore.h"
 #include "io/Values.h"
+#include "window/ShownText.h"
 
 #include <QDateTime>
 #include <QFont>
@@ -84,9 +85,9 @@ QVariant VConnectionModel::data(const QModelIndex& index, int role) const
     }
     switch (index.column()) {
     case ColumnName:
-        return QString::fromStdString(device.Name);
+        return ShownLine(QString::fromStdString(device.Name));
     case ColumnId:
-        return QString::fromStdString(device.Id);
+        return ShownLine(QString::fromStdString(device.Id));
     case ColumnState:
         return device.IsConnected ? tr("connected") : tr("gone");
     case ColumnSince:

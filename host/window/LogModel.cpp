@@ -1,5 +1,7 @@
 #include "window/LogModel.h"
 
+#include "window/ShownText.h"
+
 #include <QColor>
 #include <QDateTime>
 
@@ -41,8 +43,7 @@ QVariant TextOfLine(const VLogLine& line, int column)
     case VLogModel::ColumnCategory:
         return QString::fromStdString(line.Category);
     case VLogModel::ColumnText:
-        // A device's text in it must not pass for further lines.
-        return QString::fromStdString(line.Text).replace('\n', ' ');
+        return ShownLine(QString::fromStdString(line.Text));
     default:
         return QVariant();
     }

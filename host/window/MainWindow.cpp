@@ -105,7 +105,10 @@ QWidget* VMainWindow::MakeCameraPage()
                                     new VChoiceDelegate(GreyscaleModes(), table));
     table->setEditTriggers(QAbstractItemView::DoubleClicked | QAbstractItemView::EditKeyPressed |
                            QAbstractItemView::AnyKeyPressed);
-    table->horizontalHeader()->setSectionResizeMode(QHeaderView::ResizeToContents);
+    QHeaderView* const header = table->horizontalHeader();
+    header->setStretchLastSection(false);
+    header->setSectionResizeMode(QHeaderView::ResizeToContents);
+    header->setSectionResizeMode(VCameraModel::ColumnName, QHeaderView::Stretch);
 
     tapBox->setObjectName("tapToSelect");
     connect(tapBox, &QCheckBox::clicked, this,

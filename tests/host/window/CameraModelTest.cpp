@@ -98,13 +98,25 @@ TEST_F(CameraModel, ShowsAProposedValueUntilTheHardwareConfirmsIt)
     EXPECT_TRUE(IsPending(0, VCameraModel::ColumnStrobe));
     const QModelIndex cell = Cell(0, VCameraModel::ColumnStrobe);
     EXPECT_TRUE(cell.data(Qt::FontRole).value<QFont>().italic());
-    EXPECT_EQ("Asked for 0.75; the camera still has 0.5", cell.data(Qt::ToolTipRole).toString());
+    EXPECT_EQ("<p>Asked for 0.75; the camera still has 0.5</p>",
+              cell.data(Qt::ToolTipRole).toString());
 
     Confirm();
 
     EXPECT_TRUE(TestSupport::WaitFor([&] { return !IsPending(0, VCameraModel::ColumnStrobe); }));
     EXPECT_EQ("0.75", Text(0, VCameraModel::ColumnStrobe));
     EXPECT_FALSE(cell.data(Qt::FontRole).isValid());
+}
+
+TEST_F(CameraModel, ShowsANameOnOneLineAndWithoutMarkup)
+{
+    EXPECT_TRUE(Edit(0, VCameraModel::ColumnName, "<b>one</b>\ntwo"));
+
+    EXPECT_TRUE(ComesToShow(0, VCameraModel::ColumnName, "<b>one</b> two"));
+    const QModelIndex cell = Cell(0, VCameraModel::ColumnName);
+    EXPECT_EQ("<b>one</b>\ntwo", cell.data(Qt::EditRole).toString());
+    EXPECT_EQ("<p>Asked for &lt;b&gt;one&lt;/b&gt; two; the camera still has Camera 1</p>",
+              cell.data(Qt::ToolTipRole).toString());
 }
 
 TEST_F(CameraModel, ShowsWhatTheHardwareMadeOfAProposal)

@@ -12,6 +12,7 @@
 #include <QComboBox>
 #include <QDialog>
 #include <QFile>
+#include <QHeaderView>
 #include <QLabel>
 #include <QLineEdit>
 #include <QQuickItem>
@@ -86,6 +87,43 @@ TEST_F(HostWindow, ShowsTheCamerasFromTheStart)
     ASSERT_EQ(4, table.model()->rowCount());
     EXPECT_EQ("Camera 4", Text(table, 3, VCameraModel::ColumnName));
     KeepPicture("window-light");
+}
+
+TEST_F(HostWindow, GivesTheRoomThatIsLeftToTheNames)
+{
+    auto& table = Find<QTableView>("cameras");
+    const QHeaderView& header = *table.horizontalHeader();
+
+    // No column is wider than it need be but the names, which are cut where they are too long.
+    EXPECT_EQ(header.sectionSizeHint(VCameraModel::ColumnSelected),
+              header.sectionSize(VCameraModel::ColumnSelected));
+    EXPECT_EQ(table.viewport()->width(), header.length());
+    Write({"Device", "qx:1", "Settings", "Name"}, MakeStringValue(std::string(400, 'W')));
+    EXPECT_TRUE(TestSupport::WaitFor(
+        [&] { return Text(table, 0, VCameraModel::ColumnName) == std::string(400, 'W'); }));
+    EXPECT_EQ(table.viewport()->width(), header.length());
+    KeepPicture("window-long-name");
+}
+
+TEST_F(HostWindow, ShowsNamesOfEveryKind)
+{
+    auto& table = Find<QTableView>("connections");
+    const std::string rightToLeft =
+        "\u05e9\u05dc\u05d8 \u05d1\u05de\u05d4 \u05e8\u05d0\u05e9\u05d9";
+    Connect("id-1", rightToLeft, false);
+    Connect("id-2", "one\ntwo", false);
+    Connect("id-3", "", false);
+    Connect("id-4", std::string(100000, 'W'), false);
+    Connect("00000000-1111-2222-3333-444444444444", "Director's tablet");
+    ASSERT_TRUE(TestSupport::WaitFor([&] { return table.model()->rowCount() == 5; }));
+    ASSERT_TRUE(TestSupport::WaitFor(
+        [&] { return Text(table, 0, VConnectionModel::ColumnName) == "Director's tablet"; }));
+    KeepPicture("window-names");
+
+    EXPECT_EQ(rightToLeft, Text(table, 1, VConnectionModel::ColumnName));
+    EXPECT_EQ("one two", Text(table, 2, VConnectionModel::ColumnName));
+    EXPECT_EQ("", Text(table, 3, VConnectionModel::ColumnName));
+    EXPECT_LT(Text(table, 4, VConnectionModel::ColumnName).size(), 1000U);
 }
 
 TEST_F(HostWindow, TakesWhatTheOperatorTypes)
