@@ -80,11 +80,22 @@ std::uint32_t TakeCount(VConsoleLine& line)
     return *count;
 }
 
-/// Returns the value of a text under the schema that a parameter's values have.
-VDataValue ParseValue(const VSettingModel& setting, const std::string& text)
+std::string TrimBlanks(const std::string& text)
+{
+    const std::size_t begin = text.find_first_not_of(" \t");
+    return begin == std::string::npos
+               ? std::string()
+               : text.substr(begin, text.find_last_not_of(" \t") - begin + 1);
+}
+
+/// Returns the value of a text under the schema that a parameter's values have. Blanks at the end
+/// belong to a text without quotes, and to nothing else.
+VDataValue ParseValue(const VSettingModel& setting, const std::string& given)
 {
     VDataValue value;
     value.Schema = setting.Initial.Schema;
+    const std::string text =
+        value.Schema->Type == KVR::IO::EType::String ? given : TrimBlanks(given);
     const char* position = text.data();
     const char* const end = position + text.size();
     if (!KVR::IO::TextToBinary(position, end, *value.Schema, value.Bytes,
@@ -100,14 +111,6 @@ void SetValue(VSimulatedParameter& parameter, const VDataValue& value)
     if (!parameter.SetValue(value)) {
         throw VConsoleError(parameter.Setting().Path.Text() + " refuses to be changed");
     }
-}
-
-std::string TrimBlanks(const std::string& text)
-{
-    const std::size_t begin = text.find_first_not_of(" \t");
-    return begin == std::string::npos
-               ? std::string()
-               : text.substr(begin, text.find_last_not_of(" \t") - begin + 1);
 }
 
 /// Reads camera numbers between commas; no text at all is none.

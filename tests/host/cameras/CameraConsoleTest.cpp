@@ -47,6 +47,8 @@ TEST_F(CameraConsole, SetWritesWhatTheUserAsksForAndGetShowsIt)
         {"Device qx:1 Threshold", "1e-1", R"(ok "0.1")"},
         {"Device qx:1 ShutterDuration", "0.5", R"(ok "0.5")"},
         {"Device qx:1 GreyscaleMode", "NoEdges", R"(ok "NoEdges")"},
+        {"Device qx:1 GreyscaleMode", "All \t", R"(ok "All")"},
+        {"Device qx:1 Name", "blank at the end ", R"(ok "blank at the end ")"},
         {"Device qx:1 Name", "Left of the stage", R"(ok "Left of the stage")"},
         {"Device qx:1 Name", R"("a, b \"c\"")", R"(ok "a, b \"c\"")"},
         {"Device qx:1 Name", "\"\"", R"(ok "")"},
@@ -54,7 +56,7 @@ TEST_F(CameraConsole, SetWritesWhatTheUserAsksForAndGetShowsIt)
         {"Device qx:1 UserId", "4294967295", R"(ok "4294967295")"},
         {"Device qx:1 DisplayType", "Other", R"(ok "Other")"},
         {"System Gen6System EnableTapToSelect", "true", R"(ok "true")"},
-        {"System Gen6System EnableTapToSelect", "false", R"(ok "false")"},
+        {"System Gen6System EnableTapToSelect", "false ", R"(ok "false")"},
     };
     for (const auto& [parameter, value, shown] : cases) {
         EXPECT_EQ("ok", console.Answer(std::string("set ") + parameter + " " + value)) << parameter;
