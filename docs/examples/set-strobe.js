@@ -58,10 +58,13 @@ async function run(name, parameters) {
   if (Status === 'Pending') ({ Status } = parametersOf(await decided));
   if (Status !== 'Authorized') fail(`not let in: ${Status}`);
   setInterval(() => run('System.Heartbeat', { BeatId: String(Date.now()) }), 1000);
-  const changed = event('Event.Cameras.SettingChanged', (told) =>
-    told.CameraId === camera && told.SettingName === 'StrobeIntensity', 5);
-  await run('CameraSettings_SetStrobeIntensity',
-    { Param_CameraDeviceId: camera, Param_StrobeIntensity: strobe });
-  console.log(`strobe of camera ${camera}: ${parametersOf(await changed).SettingValue}`);
-  process.exit(0);
+  const done = (now) => { console.log(`strobe of camera ${camera}: ${now}`); process.exit(0); };
+  event('Event.Cameras.SettingChanged', (told) =>
+    told.CameraId === camera && told.SettingName === 'StrobeIntensity', 5)
+    .then((xml) => done(parametersOf(xml).SettingValue));
+  const identity = { Param_CameraDeviceId: camera };
+  await run('CameraSettings_SetStrobeIntensity', { ...identity, Param_StrobeIntensity: strobe });
+  setTimeout(async () => { // a value that was there already brings no event
+    done((await run('CameraSettings_GetStrobeIntensity', identity)).Param_StrobeIntensity);
+  }, 1000);
 })();

@@ -188,6 +188,15 @@ class Example(unittest.TestCase):
         self.assertEqual(0.3, state["cameras"][1]["StrobeIntensity"])
         self.assertEqual("Strobe", state["control"]["strobe-1"]["Name"])
 
+    def test_sets_it_again_though_no_event_comes_then(self) -> None:
+        with QuorixHost():
+            for strobe, result in (("0.3", "0.3"), ("0.3", "0.3"), ("5", "1.0"), ("5", "1.0")):
+                with self.subTest(strobe=strobe):
+                    self.assertEqual(
+                        (0, f"strobe of camera 2: {result}\n", ""),
+                        self.run_example("127.0.0.1", "2", strobe),
+                    )
+
     def test_tells_what_went_wrong(self) -> None:
         with QuorixHost():
             self.assertEqual(

@@ -113,7 +113,7 @@ EVENTS: Dict[str, EventFacts] = {
         ],
     ),
     "Event.Cameras.SettingChanged": EventFacts(
-        "A number of a camera has changed, or was written again.",
+        "A number of a camera has changed.",
         [
             CAMERA,
             ("SettingName", '"StrobeIntensity", "Threshold" or "ShutterDuration"'),

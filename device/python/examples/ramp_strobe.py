@@ -9,6 +9,7 @@ from __future__ import annotations
 
 import argparse
 import sys
+import threading
 import time
 from typing import Iterator
 
@@ -35,17 +36,22 @@ def ramp(client: Client, camera: str, target: float, seconds: float, count: int)
     now = require(client.execute("CameraSettings_GetStrobeIntensity", identity))
     begin = float(now.parameters["Param_StrobeIntensity"])
     print(f"camera {camera}: strobe {begin:g}", flush=True)
+    shown = begin
     with client.listen(CONFIRMED) as confirmations:
         start = time.monotonic()
         for number, value in enumerate(steps(begin, target, count), 1):
             time.sleep(max(0.0, start + seconds * number / count - time.monotonic()))
-            wanted = {**identity, "Param_StrobeIntensity": f"{value:.6g}"}
+            text = f"{value:.6g}"
+            if float(text) == shown:
+                continue  # the host has nothing to confirm
+            wanted = {**identity, "Param_StrobeIntensity": text}
             require(client.execute("CameraSettings_SetStrobeIntensity", wanted))
             while True:  # the events of other cameras and settings come here too
                 event = confirmations.next(5.0).parameters
                 if (event["CameraId"], event["SettingName"]) == (camera, "StrobeIntensity"):
                     break
-            print(f"camera {camera}: strobe {float(event['SettingValue']):g}", flush=True)
+            shown = float(event["SettingValue"])
+            print(f"camera {camera}: strobe {shown:g}", flush=True)
 
 
 def main() -> int:
@@ -60,6 +66,10 @@ def main() -> int:
     arguments = parser.parse_args()
     if arguments.steps < 1:
         parser.error("a ramp has one step or more")
+    if not 0 <= arguments.to <= 1:  # which is so for what is not a number, too
+        parser.error("the target lies from 0 to 1")  # the host would keep another value in silence
+    if not 0 <= arguments.seconds < threading.TIMEOUT_MAX:
+        parser.error("a ramp takes some seconds")
     try:
         with Client() as client:
             client.connect(arguments.host, arguments.port)

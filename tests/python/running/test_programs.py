@@ -68,6 +68,17 @@ class Programs(unittest.TestCase):
                 self.assertEqual(0, code)
                 self.assertEqual(1, self.host.state()["cameras"][0]["StrobeIntensity"])
 
+    def test_the_strobe_is_ramped_again_though_no_event_comes_then(self) -> None:
+        words = [sys.executable, "examples/ramp_strobe.py", "--to", "0.5", "--seconds", "0.1"]
+        self.assertEqual((0, "camera 1: strobe 0.5\n"), run(*words))
+
+    def test_the_ramp_refuses_what_no_host_takes(self) -> None:
+        for wrong in (["--to", "nan"], ["--to", "1.5"], ["--steps", "0"], ["--seconds", "inf"]):
+            with self.subTest(wrong=wrong):
+                code, output = run(sys.executable, "examples/ramp_strobe.py", *wrong)
+                self.assertEqual(2, code)
+                self.assertNotIn("Traceback", output)
+
     def test_the_ramp_tells_what_the_host_says_against_it(self) -> None:
         code, output = run(sys.executable, "examples/ramp_strobe.py", "--camera", "99")
         self.assertEqual(
