@@ -301,6 +301,18 @@ TEST_F(ClientConnection, SendToAPeerThatIsGoneReturnsNormally)
     }
 }
 
+TEST_F(ClientConnection, ReadsOnWhereNothingCanBeWritten)
+{
+    VRawClient client(socket->Port());
+    const std::shared_ptr<IClientConnection> connection = ConnectionOf(0).lock();
+    ASSERT_EQ(0, ::shutdown(OtherEndOf(client), SHUT_WR)); // behind the connection's back
+
+    connection->Send(L"not written");
+    client.SendFrame("read");
+
+    EXPECT_EQ(std::vector<std::wstring>{L"read"}, messages.Wait(1));
+}
+
 TEST_F(ClientConnection, CloseEndsTheConnection)
 {
     VRawClient client(socket->Port());

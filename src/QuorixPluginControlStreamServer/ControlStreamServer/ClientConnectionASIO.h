@@ -45,7 +45,7 @@ public:
     ~VClientConnectionASIO() noexcept(false) override;
 
 private:
-    /// What boost::asio::async_read reads from: the socket, as long as there is one.
+    /// What boost::asio::async_read reads from: the socket, until it closes.
     class VStream
     {
     public:
