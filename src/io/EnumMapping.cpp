@@ -4,6 +4,7 @@
 
 #include <algorithm>
 #include <string_view>
+#include <unordered_map>
 
 namespace KVR {
 namespace IO {
@@ -11,6 +12,7 @@ namespace IO {
 namespace {
 
 using NamesOfValues = std::map<std::int32_t, std::vector<std::string>>;
+using NumbersOfNames = std::unordered_map<std::string, std::int32_t>;
 
 constexpr std::int32_t mostOf8Bits = 0xFF;
 constexpr std::int32_t mostOf16Bits = 0xFFFF;
@@ -32,13 +34,14 @@ NamesOfValues NamesByValue(const ISchema& schema)
     return names;
 }
 
-std::vector<ISchema::EnumValue> CleanEntries(const ISchema& schema)
+/// Returns the number of each cleaned name, the first of equal ones.
+NumbersOfNames NumbersByName(const ISchema& schema)
 {
-    std::vector<ISchema::EnumValue> entries = schema.EnumValues;
-    for (ISchema::EnumValue& entry : entries) {
-        entry.first = WithoutLegacyPrefix(entry.first);
+    NumbersOfNames numbers;
+    for (const ISchema::EnumValue& entry : schema.EnumValues) {
+        numbers.emplace(WithoutLegacyPrefix(entry.first), entry.second);
     }
-    return entries;
+    return numbers;
 }
 
 /// Deliberate: the limits are those of unsigned numbers, and a negative number passes. Old files
@@ -57,16 +60,13 @@ void AddLines(const std::vector<std::string>& names, const char* what,
     }
 }
 
-/// Finds the entry of the first of the names that has one.
-const ISchema::EnumValue* FindEntry(const std::vector<ISchema::EnumValue>& entries,
-                                    const std::vector<std::string>& names)
+/// Finds the number of the first of the names that has one.
+const std::int32_t* FindNumber(const NumbersOfNames& numbers, const std::vector<std::string>& names)
 {
     for (const std::string& name : names) {
-        const auto found =
-            std::find_if(entries.begin(), entries.end(),
-                         [&](const ISchema::EnumValue& entry) { return entry.first == name; });
-        if (found != entries.end()) {
-            return &*found;
+        const auto found = numbers.find(name);
+        if (found != numbers.end()) {
+            return &found->second;
         }
     }
     return nullptr;
@@ -94,11 +94,11 @@ bool BuildEnumMapping(const ISchema& stored, const ISchema& current, EnumMapping
         }
     }
 
-    const std::vector<ISchema::EnumValue> currentEntries = CleanEntries(current);
+    const NumbersOfNames currentNumbers = NumbersByName(current);
     for (const NamesOfValues::value_type& entry : storedNames) {
-        const ISchema::EnumValue* const found = FindEntry(currentEntries, entry.second);
+        const std::int32_t* const found = FindNumber(currentNumbers, entry.second);
         if (found != nullptr) {
-            mapping[entry.first] = found->second;
+            mapping[entry.first] = *found;
         } else {
             AddLines(entry.second, " could not be mapped", errors);
         }

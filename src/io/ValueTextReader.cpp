@@ -98,10 +98,8 @@ bool VValueTextReader::ReadEnum(const ISchema& schema)
     if (!TakeString(name)) {
         return false;
     }
-    const auto entry =
-        std::find_if(schema.EnumValues.begin(), schema.EnumValues.end(),
-                     [&](const ISchema::EnumValue& each) { return each.first == name; });
-    return entry != schema.EnumValues.end() && AppendEnum(bytes, schema.Type, entry->second);
+    const ISchema::EnumValue* const entry = enumEntries.FindName(schema, name);
+    return entry != nullptr && AppendEnum(bytes, schema.Type, entry->second);
 }
 
 bool VValueTextReader::ReadFixed(const ISchema& schema, bool isTop)

@@ -1,5 +1,6 @@
 #pragma once
 
+#include "io/EnumEntries.h"
 #include "io/SchemaTextMode.h"
 #include "io/TextCursor.h"
 
@@ -9,8 +10,6 @@
 
 namespace KVR {
 namespace IO {
-
-struct ISchema;
 
 namespace Detail {
 
@@ -54,6 +53,7 @@ private:
     VTextCursor cursor;
     std::vector<unsigned char>& bytes;
     const SchemaTextMode mode;
+    VEnumEntries enumEntries;
 };
 
 } // namespace Detail

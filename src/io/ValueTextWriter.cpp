@@ -6,8 +6,6 @@
 #include "io/SkipReaders.h"
 #include "io/ValueTextNumbers.h"
 
-#include <algorithm>
-
 namespace KVR {
 namespace IO {
 namespace Detail {
@@ -100,10 +98,8 @@ bool VValueTextWriter::WriteString()
 bool VValueTextWriter::WriteEnum(const ISchema& schema)
 {
     const std::int32_t value = ReadEnum(schema.Type, reader);
-    const auto entry =
-        std::find_if(schema.EnumValues.begin(), schema.EnumValues.end(),
-                     [&](const ISchema::EnumValue& each) { return each.second == value; });
-    if (entry == schema.EnumValues.end()) {
+    const ISchema::EnumValue* const entry = enumEntries.FindNumber(schema, value);
+    if (entry == nullptr) {
         return false;
     }
     AppendWord(entry->first);

@@ -1,5 +1,6 @@
 #pragma once
 
+#include "io/EnumEntries.h"
 #include "io/SchemaTextMode.h"
 #include "io/VectorReader.h"
 
@@ -10,8 +11,6 @@
 
 namespace KVR {
 namespace IO {
-
-struct ISchema;
 
 namespace Detail {
 
@@ -47,6 +46,7 @@ private:
     VVectorReader reader;
     std::string& text;
     const SchemaTextMode mode;
+    VEnumEntries enumEntries;
     std::size_t textWithoutBytes = 0; // written for elements that no bytes stand behind
 };
 

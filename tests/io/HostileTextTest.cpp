@@ -6,6 +6,7 @@
 
 #include <gtest/gtest.h>
 
+#include <cstring>
 #include <stdexcept>
 #include <string>
 
@@ -164,4 +165,34 @@ TEST(HostileValueText, LongStringLengthFailsWithoutItsMemory)
 
     EXPECT_FALSE(Writes(Plain(EType::String), greatestCountBytes, SchemaTextModeNamed, text));
     EXPECT_LT(text.capacity(), 1024u);
+}
+
+/// Looked at one by one for each value, so many entries would not end within the test's time.
+TEST(HostileValueText, GreatListOfAGreatEnumIsReadAndWritten)
+{
+    constexpr std::int32_t count = 200000;
+    ISchema names = Plain(EType::Enum32);
+    ByteVector values(4 + 4 * std::size_t{count});
+    std::memcpy(values.data(), &count, sizeof count);
+    for (std::int32_t number = 0; number < count; ++number) {
+        const std::int32_t value = count - 1 - number;
+        names.EnumValues.emplace_back("e" + std::to_string(number), number);
+        std::memcpy(values.data() + 4 + 4 * std::size_t(number), &value, sizeof value);
+    }
+    names.EnumValues.emplace_back("e5", -1); // of equal names and numbers the first counts
+    names.EnumValues.emplace_back("late", 5);
+    const ISchema schema = ListOf(names);
+    std::string text;
+    ByteVector bytes;
+
+    ASSERT_TRUE(BinaryToText(values, schema, text, SchemaTextModeNamed));
+    const char* begin = text.data();
+    ASSERT_TRUE(TextToBinary(begin, begin + text.size(), schema, bytes, SchemaTextModeNamed));
+
+    EXPECT_EQ(values, bytes);
+    EXPECT_NE(std::string::npos, text.find("\"e6\",\"e5\",\"e4\""));
+    text.replace(text.size() - 3, 1, "x"); // of the last name
+    EXPECT_FALSE(Reads(schema, text, SchemaTextModeNamed));
+    values.back() = 0x7F;
+    EXPECT_FALSE(BinaryToText(values, schema, text, SchemaTextModeNamed));
 }
