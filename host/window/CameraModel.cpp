@@ -178,8 +178,11 @@ QString VCameraModel::TextOf(const VRow& row, int column) const
 
 QString VCameraModel::TipOf(const VCell& cell) const
 {
-    if (!cell.Parameter || !cell.IsPending()) {
+    if (!cell.Parameter) {
         return QString();
+    }
+    if (!cell.IsPending()) {
+        return ShownTip(ShownLine(ShownText(cell.Value))); // its column may be too narrow for it
     }
     return ShownTip(
         tr("Asked for %1; the camera still has %2")

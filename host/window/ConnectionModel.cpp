@@ -80,10 +80,16 @@ QVariant VConnectionModel::data(const QModelIndex& index, int role) const
         font.setBold(true);
         return font;
     }
-    if (role != Qt::DisplayRole) {
-        return QVariant();
+    if (role == Qt::ToolTipRole) {
+        const QString text = TextOf(device, index.column());
+        return text.isEmpty() ? QVariant() : ShownTip(text);
     }
-    switch (index.column()) {
+    return role == Qt::DisplayRole ? TextOf(device, index.column()) : QVariant();
+}
+
+QString VConnectionModel::TextOf(const VDevice& device, int column) const
+{
+    switch (column) {
     case ColumnName:
         return ShownLine(QString::fromStdString(device.Name));
     case ColumnId:
@@ -97,7 +103,7 @@ QVariant VConnectionModel::data(const QModelIndex& index, int role) const
     case ColumnBeat:
         return BeatText(device);
     default:
-        return QVariant();
+        return QString();
     }
 }
 

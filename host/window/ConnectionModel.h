@@ -57,6 +57,7 @@ private:
 
     std::vector<VDevice> ReadDevices() const;
     bool IsPresentDevice(const VDevice& device) const;
+    QString TextOf(const VDevice& device, int column) const;
     QString BeatText(const VDevice& device) const;
 
     const std::shared_ptr<VDataStore> store;

@@ -1,6 +1,7 @@
 #include "window/MainWindow.h"
 
 #include "ControlSystem.h"
+#include "DPI/DPIUtils.h"
 #include "Host.h"
 #include "QuorixDataStore/DataStore.h"
 #include "cameras/SimulatedCameras.h"
@@ -38,6 +39,7 @@ constexpr int tickMilliseconds = 1000;
 constexpr int mostRowsMeasured = 50; // for the width of a column, at each change
 constexpr QSize firstSize(1360, 720);
 constexpr int firstPanelWidth = 460;
+constexpr int widestDeviceColumn = 280; // what is longer is told in full by its tool tip
 
 /// Returns a view of a table, which scrolls where it does not fit.
 QTableView* MakeTable(QAbstractItemModel* model, const char* name)
@@ -132,6 +134,7 @@ void VMainWindow::AddControlPanel()
     layout->addWidget(badge);
     layout->addWidget(table);
     table->horizontalHeader()->setSectionResizeMode(QHeaderView::ResizeToContents);
+    table->horizontalHeader()->setMaximumSectionSize(DPIUtils::Scale(widestDeviceColumn));
     QDockWidget* const dock = AddDock(*this, "Control", panel, Qt::RightDockWidgetArea);
     resizeDocks({dock}, {firstPanelWidth}, Qt::Horizontal);
 }

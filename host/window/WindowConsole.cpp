@@ -27,12 +27,14 @@ VAnswer TakeAnswer(VConsoleLine& line)
     if (answer.Word != "allow" && answer.Word != "deny" && answer.Word != "cancel") {
         throw VConsoleError("expected allow, deny or cancel, not '" + answer.Word + "'");
     }
-    const std::string remember = line.TakeRest();
-    if (remember == "remember" || remember == "forget") {
+    if (line.HasMore()) {
+        const std::string remember = line.TakeWord("remember or forget");
+        if (remember != "remember" && remember != "forget") {
+            throw VConsoleError("expected remember or forget, not '" + remember + "'");
+        }
         answer.Remember = remember == "remember";
-    } else if (!remember.empty()) {
-        throw VConsoleError("expected remember or forget, not '" + remember + "'");
     }
+    line.ExpectEnd();
     return answer;
 }
 

@@ -89,10 +89,10 @@ void KeepPicture(const QImage& picture, const std::string& name)
     }
 }
 
-void KeepPicture(QWidget& dialog, const std::string& name)
+void KeepPicture(const QWidget& dialog, const std::string& name)
 {
     const int scale = static_cast<int>(dialog.devicePixelRatioF());
-    KeepPicture(dialog.grab().toImage(), name + "-" + std::to_string(scale));
+    KeepPicture(ViewOf(dialog).grabFramebuffer(), name + "-" + std::to_string(scale));
 }
 
 /// Items that can be seen must lie inside the view and not upon each other.

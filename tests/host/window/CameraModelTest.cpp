@@ -106,6 +106,7 @@ TEST_F(CameraModel, ShowsAProposedValueUntilTheHardwareConfirmsIt)
     EXPECT_TRUE(TestSupport::WaitFor([&] { return !IsPending(0, VCameraModel::ColumnStrobe); }));
     EXPECT_EQ("0.75", Text(0, VCameraModel::ColumnStrobe));
     EXPECT_FALSE(cell.data(Qt::FontRole).isValid());
+    EXPECT_EQ("<p>0.75</p>", cell.data(Qt::ToolTipRole).toString());
 }
 
 TEST_F(CameraModel, ShowsANameOnOneLineAndWithoutMarkup)

@@ -180,7 +180,7 @@ TEST_F(HostDialog, StaysUpWhenTheDeviceHasGone)
     }
 
     EXPECT_EQ("Tablet", AwaitDialog()["clientName"]);
-    EXPECT_EQ("ok", host.Command("answer allow remember"));
+    EXPECT_EQ("ok", host.Command("answer allow  remember "));
     EXPECT_THAT(device.NextEvent(), HasSubstr(Status("Authorized")));
 }
 
@@ -257,6 +257,7 @@ TEST_F(HostDialog, RefusesAnswersThatAreNone)
               host.Command("answer perhaps"));
     EXPECT_EQ("error: expected remember or forget, not 'never'",
               host.Command("answer allow never"));
+    EXPECT_EQ("error: unexpected 'forget'", host.Command("answer allow remember forget"));
     EXPECT_EQ("error: expected allow, deny or cancel", host.Command("answer"));
 
     EXPECT_FALSE(State()["dialog"].is_null());

@@ -124,6 +124,11 @@ TEST_F(HostWindow, ShowsNamesOfEveryKind)
     EXPECT_EQ("one two", Text(table, 2, VConnectionModel::ColumnName));
     EXPECT_EQ("", Text(table, 3, VConnectionModel::ColumnName));
     EXPECT_LT(Text(table, 4, VConnectionModel::ColumnName).size(), 1000U);
+    EXPECT_LT(table.columnWidth(VConnectionModel::ColumnName), table.viewport()->width());
+    EXPECT_EQ("<p>00000000-1111-2222-3333-444444444444</p>",
+              table.model()->index(0, VConnectionModel::ColumnId).data(Qt::ToolTipRole));
+    EXPECT_FALSE(
+        table.model()->index(3, VConnectionModel::ColumnName).data(Qt::ToolTipRole).isValid());
 }
 
 TEST_F(HostWindow, TakesWhatTheOperatorTypes)
