@@ -5,6 +5,16 @@
 
 namespace ControlStream {
 
+namespace {
+
+EPermission OutcomeOf(const VEvent& event)
+{
+    const bool authorized = GetValue(event.Parameters, "Status") == "Authorized";
+    return authorized ? EPermission::Authorized : EPermission::Refused;
+}
+
+} // namespace
+
 VAttendance::VAttendance(const VAsyncOptions& asyncOptions, Run runCommand,
                          std::function<void()> changed, Now clock)
     : options(asyncOptions),
@@ -41,9 +51,9 @@ void VAttendance::OnEvent(const VEvent& event)
         Change(EPermission::Unasked); // the host ends; a later one is asked anew
     } else if (event.Name == "Event.Authorize" && permission == EPermission::Pending) {
         // The event names no device. Who has a request open is the one that is meant.
-        const bool authorized = GetValue(event.Parameters, "Status") == "Authorized";
-        nextBeat = now();
-        Change(authorized ? EPermission::Authorized : EPermission::Refused);
+        Settle(OutcomeOf(event));
+    } else if (event.Name == "Event.Authorize" && asking) {
+        overtaking = OutcomeOf(event); // counts where the answer says that a request was open
     } else if (event.Name == "Event.Authorize" && permission == EPermission::Taken) {
         nextAsk = now(); // a decision was made, perhaps on a request from before a reconnection
     }
@@ -98,6 +108,7 @@ bool VAttendance::Beats() const
 void VAttendance::SendRequest()
 {
     asking = true;
+    overtaking.reset();
     nextAsk = Clock::time_point::max();
     run({"System.Authorize",
          {{"DeviceId", options.Device->Id}, {"DeviceName", options.Device->Name}}},
@@ -118,12 +129,11 @@ void VAttendance::OnAnswer(const VOutcome<VCommandReply>& outcome)
     const std::string status =
         outcome && outcome.Get().Ok ? GetValue(outcome.Get().Parameters, "Status") : std::string();
     if (status == "Authorized") {
-        nextBeat = now();
-        Change(EPermission::Authorized);
+        Settle(EPermission::Authorized);
     } else if (status == "Pending") {
-        Change(EPermission::Pending);
+        Settle(overtaking.value_or(EPermission::Pending));
     } else if (status == "Failed") {
-        Change(EPermission::Refused);
+        Settle(EPermission::Refused);
     } else {
         // "Connected", a failure, or no answer in time: it may go better later.
         if (options.AskAgain > std::chrono::milliseconds::zero()) {
@@ -140,6 +150,14 @@ void VAttendance::OnBeat(const VOutcome<VCommandReply>& outcome)
     if (error != nullptr && error->Kind() == EErrorKind::TimedOut) {
         failure = *error;
     }
+}
+
+void VAttendance::Settle(EPermission answer)
+{
+    if (answer == EPermission::Authorized) {
+        nextBeat = now();
+    }
+    Change(answer);
 }
 
 void VAttendance::Change(EPermission next)

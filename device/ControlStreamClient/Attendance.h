@@ -56,6 +56,7 @@ private:
     void SendBeat();
     void OnAnswer(const VOutcome<VCommandReply>& outcome);
     void OnBeat(const VOutcome<VCommandReply>& outcome);
+    void Settle(EPermission answer);
     void Change(EPermission next);
 
     const VAsyncOptions options;
@@ -64,8 +65,9 @@ private:
     const Now now;
     EPermission permission = EPermission::Unasked;
     bool connected = false;
-    bool asking = false;  // a request is under way
-    bool beating = false; // a heartbeat is
+    bool asking = false;                   // a request is under way
+    bool beating = false;                  // a heartbeat is
+    std::optional<EPermission> overtaking; // an outcome that came before the answer did
     std::uint64_t beats = 0;
     Clock::time_point nextAsk = Clock::time_point::max();
     Clock::time_point nextBeat = Clock::time_point::max();

@@ -2,6 +2,8 @@
 
 #include <gmock/gmock.h>
 
+#include <utility>
+
 namespace {
 
 using namespace ControlStream;
@@ -115,6 +117,40 @@ TEST_F(Attendance, WaitsForTheOperatorAndHearsTheOutcome)
     EXPECT_THAT(ActAfter(0ms), ElementsAre("System.Heartbeat BeatId=1"));
     Hear("Failed");
     EXPECT_EQ(EPermission::Authorized, attendance->Permission()) << "that was another device's";
+}
+
+TEST_F(Attendance, TakesAnOutcomeThatOvertakesTheAnswer)
+{
+    for (const auto& [status, permission] : {std::pair("Authorized", EPermission::Authorized),
+                                             std::pair("Failed", EPermission::Refused)}) {
+        Make();
+        attendance->OnConnected();
+        ActAfter(0ms);
+        Hear(status);
+        EXPECT_EQ(EPermission::Unasked, attendance->Permission()) << "it may be another device's";
+
+        AnswerStatus("Pending");
+
+        EXPECT_EQ(permission, attendance->Permission());
+        const bool beats = permission == EPermission::Authorized;
+        EXPECT_EQ(beats ? 1U : 0U, ActAfter(0ms).size());
+        open.clear();
+    }
+}
+
+TEST_F(Attendance, LeavesAnOutcomeToTheDeviceWhoseRequestWasOpen)
+{
+    Make();
+    attendance->OnConnected();
+    ActAfter(0ms);
+    Hear("Authorized");
+    AnswerStatus("Connected");
+    EXPECT_EQ(EPermission::Taken, attendance->Permission());
+
+    ActAfter(options.AskAgain);
+    AnswerStatus("Pending");
+
+    EXPECT_EQ(EPermission::Pending, attendance->Permission()) << "that was before this request";
 }
 
 TEST_F(Attendance, DoesNotNagTheOperatorAfterARefusal)
