@@ -142,16 +142,18 @@ TEST(FileSystem, AFolderThatCannotBeMadeIsLogged)
 
 TEST(FileSystem, AFolderOfAMillionLevelsIsRefusedWithoutRecursion)
 {
-    const VLogCapture log;
-    std::string path = "/tmp";
-    for (int i = 0; i < 1000000; ++i) {
-        path += "/a";
+    for (const char* level : {"/a", "/.", "/.."}) {
+        const VLogCapture log;
+        std::string path = "/tmp";
+        for (int i = 0; i < 1000000; ++i) {
+            path += level;
+        }
+
+        EnsureFolder(path);
+
+        EXPECT_EQ(log.Texts("UtilsFileSystem").size(), 1U);
+        EXPECT_FALSE(FolderExists(path));
     }
-
-    EnsureFolder(path);
-
-    EXPECT_EQ(log.Texts("UtilsFileSystem").size(), 1U);
-    EXPECT_FALSE(FolderExists(path));
 }
 
 TEST(FileSystem, WalksTheRegularFilesOfOneFolder)
@@ -162,13 +164,17 @@ TEST(FileSystem, WalksTheRegularFilesOfOneFolder)
     EnsureFolder(folder.Path("sub"));
     WriteFile(folder.Path("sub/c"), "");
     ASSERT_EQ(mkfifo(folder.Path("pipe").c_str(), 0600), 0);
+    ASSERT_EQ(symlink("sub/c", folder.Path("link").c_str()), 0);
+    ASSERT_EQ(symlink("sub", folder.Path("linkToFolder").c_str()), 0);
+    ASSERT_EQ(symlink("missing", folder.Path("linkToNothing").c_str()), 0);
+    WriteFile(folder.Path("line\nfeed"), "");
     std::set<std::string> names;
 
     ForEachFile(folder.Path(), [&](const boost::filesystem::path& file) {
         names.insert(file.filename().string());
     });
 
-    EXPECT_EQ(names, (std::set<std::string>{"a", "b"}));
+    EXPECT_EQ(names, (std::set<std::string>{"a", "b", "line\nfeed", "link"}));
 }
 
 TEST(FileSystem, AFolderThatCannotBeWalkedIsLogged)
@@ -235,6 +241,15 @@ TEST(ReadFile, TakesTheGreatestLimitForNone)
     WriteFile(folder.Path("f"), "content");
 
     EXPECT_EQ(ReadFile(folder.Path("f"), std::numeric_limits<std::size_t>::max()), "content");
+}
+
+TEST(ReadFile, GivesNothingOfAFileThatCannotBeOpenedOrRead)
+{
+    const VTemporaryFolder folder;
+    WriteFile(folder.Path("f"), "content");
+
+    EXPECT_EQ(ReadFile(folder.Path("f") + std::string("\0x", 2), 100), std::nullopt);
+    EXPECT_EQ(ReadFile("/proc/self/mem", 100), std::nullopt); // fails at its first byte
 }
 
 TEST(ReadFile, TakesNothingButRegularFiles)

@@ -67,4 +67,26 @@ TEST(ReplaceFileCrash, DoesNotHinderTheNextOne)
                                 });
 }
 
+#ifdef __x86_64__
+TEST(ReplaceFileCrash, WaitsForTheDiskBeforeTheFileTakesItsPlaceAndAfterwards)
+{
+    const VTemporaryFolder folder;
+    WriteFile(folder.Path("file"), oldContent);
+    TestSupport::VTracedProcess process([&] { ReplaceFile(folder.Path("file"), newContent); });
+
+    std::string calls;
+    while (process.Step()) {
+        if (process.IsBeforeWrite()) {
+            calls += "write ";
+        } else if (process.IsBefore() && process.Call() == SYS_fsync) {
+            calls += "wait ";
+        } else if (process.IsBefore() && process.Call() == SYS_rename) {
+            calls += "move ";
+        }
+    }
+
+    EXPECT_EQ(calls, "write wait move wait ");
+}
+#endif
+
 } // namespace

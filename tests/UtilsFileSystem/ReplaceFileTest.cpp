@@ -6,6 +6,7 @@
 
 #include <filesystem>
 #include <sys/stat.h>
+#include <unistd.h>
 
 using TestSupport::ContentOf;
 using TestSupport::VTemporaryFolder;
@@ -46,6 +47,25 @@ TEST(ReplaceFile, KeepsTheModeOfTheOldFile)
     EXPECT_EQ(ContentOf(folder.Path("file")), "new");
     EXPECT_EQ(ModeOf(folder.Path("file")), 0604U);
     EXPECT_EQ(folder.Count(), 1U);
+}
+
+TEST(ReplaceFile, KeepsTheOwnerOfTheOldFileWhereItMay)
+{
+    const VTemporaryFolder folder;
+    WriteFile(folder.Path("file"), "old");
+    if (chown(folder.Path("file").c_str(), 1234, 2345) != 0) {
+        GTEST_SKIP() << "only an administrator may give files away";
+    }
+
+    EXPECT_TRUE(ReplaceFile(folder.Path("file"), "new"));
+
+    struct stat status
+    {
+    };
+    ASSERT_EQ(stat(folder.Path("file").c_str(), &status), 0);
+    EXPECT_EQ(status.st_uid, 1234U);
+    EXPECT_EQ(status.st_gid, 2345U);
+    EXPECT_EQ(ContentOf(folder.Path("file")), "new");
 }
 
 TEST(ReplaceFile, TakesAnEmptyContent)

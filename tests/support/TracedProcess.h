@@ -60,6 +60,12 @@ public:
     bool IsBefore() const { return entered; }
 
 #ifdef __x86_64__
+    /// Returns the number of the system call at which the process stands.
+    long Call() const
+    {
+        return static_cast<long>(Registers().orig_rax);
+    }
+
     /// Whether the process stands before the writing of more than one byte.
     bool IsBeforeWrite() const
     {
