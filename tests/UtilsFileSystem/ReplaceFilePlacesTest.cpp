@@ -85,6 +85,30 @@ TEST(ReplaceFilePlaces, AFolderThatAllowsNoNewFileHasItsFileReplacedInPlace)
     EXPECT_EQ(folder.Count(), 1U);
 }
 
+TEST(ReplaceFilePlaces, AFileThatOnlyItsOwnerMayMoveIsReplacedInPlace)
+{
+    const VTemporaryFolder folder;
+    WriteFile(folder.Path("file"), "old");
+    constexpr uid_t somebodyElse = 1234;
+    if (chown(folder.Path("file").c_str(), somebodyElse, somebodyElse) != 0 ||
+        chown(folder.Path().c_str(), somebodyElse, somebodyElse) != 0) {
+        GTEST_SKIP() << "only an administrator may give files away";
+    }
+    chmod(folder.Path("file").c_str(), 0666);
+    chmod(folder.Path().c_str(), 01777); // as a folder for everybody's temporary files is
+
+    const int code = RunWithoutPrivileges([&] {
+        if (!ReplaceFile(folder.Path("file"), "new")) {
+            return wronglyFalse;
+        }
+        return folder.Count() == 1 ? good : filesLeft;
+    });
+
+    SKIP_IF_NOT_ALLOWED(code);
+    EXPECT_EQ(code, good);
+    EXPECT_EQ(ContentOf(folder.Path("file")), "new");
+}
+
 TEST(ReplaceFilePlaces, AFileThatMayNotBeWrittenStaysInAFolderThatWouldAllowIt)
 {
     const VTemporaryFolder folder;
