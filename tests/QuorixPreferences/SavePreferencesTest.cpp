@@ -129,10 +129,14 @@ TEST_F(SavePreferencesTest, WithoutAPlaceNothingIsWritten)
 {
     host.Others = {{26, ""}};
     Put("Preferences.User.A", MakeBoolValue(true));
+    const std::filesystem::path before = std::filesystem::current_path();
+    std::filesystem::current_path(folder.Path());
 
     Save();
 
+    std::filesystem::current_path(before);
     EXPECT_EQ(ContentOf(SystemFile()), "(no file)");
+    EXPECT_FALSE(std::filesystem::exists(folder.Path("System.Prefs"))); // nor where the host runs
     EXPECT_THAT(ContentOf(UserFile()), HasSubstr("\"A\""));
 }
 
