@@ -80,15 +80,17 @@ void VConfigurationReader::ReadNode(INode& node)
     if (!ReadName(node, NodeName, name)) {
         return;
     }
+    const std::size_t size =
+        name.size() + 1 + (path.Count() < ManyComponents ? 0 : FurtherComponentSize);
     path.Append(name);
-    pathSize += name.size() + 1;
+    pathSize += size;
     DeclareChild(node, Node, 0);
     node.ProcessChildren(
         boost::bind(&VConfigurationReader::ReadNode, this, boost::placeholders::_1), false);
     DeclareChild(node, Item, 0);
     node.ProcessChildren(
         boost::bind(&VConfigurationReader::ReadItem, this, boost::placeholders::_1), false);
-    pathSize -= name.size() + 1;
+    pathSize -= size;
     path.RemoveLast();
 }
 

@@ -43,7 +43,7 @@ private:
     UtilsRapidXml::VReaderNode root;
     IDataVerifyWriter& writer;
     VDataPath path;               // of the node that is being read
-    std::size_t pathSize = 0;     // of its text, with separators
+    std::size_t pathSize = 0;     // of its text, with what further components count
     std::size_t allPathsSize = 0; // of the items read so far
     std::unordered_map<std::string, const KVR::IO::ISchema*> formats; // read before, by their text
 };

@@ -60,4 +60,9 @@ constexpr UtilsRapidXml::IVersion UnnamedVersion{1, 0};
 /// repeat one very long path in each of its items, and fill the memory from a few megabytes.
 constexpr std::size_t GreatestPathText = std::size_t(256) << 20;
 
+/// From this many components on, a further one counts as more text than it has. A store goes along
+/// the whole path for each item, so that a few megabytes could keep it busy for minutes.
+constexpr std::size_t ManyComponents = 32;
+constexpr std::size_t FurtherComponentSize = 64;
+
 } // namespace DataStoreFileFormat

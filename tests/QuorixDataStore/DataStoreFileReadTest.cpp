@@ -352,6 +352,30 @@ TEST(ReadConfiguration, TheDataPathsOfOneFileHaveAGreatestSizeTogether)
                                          "paths together."));
 }
 
+TEST(ReadConfiguration, FurtherComponentsOfALongPathCountAsMoreText)
+{
+    constexpr std::size_t size = std::size_t(16) << 20; // of the text of each path
+    constexpr std::size_t most = DataStoreFileFormat::GreatestPathText / size;
+    const std::string item = "<Item name='x' format='{\"Type\":\"UInt8\"}' value-verified='7'/>";
+    const auto read = [&](std::size_t components) {
+        std::string content = "<Node name='" + std::string(size - 2 * components, 'n') + "'>";
+        for (std::size_t each = 1; each < components; ++each) {
+            content += "<Node name='n'>";
+        }
+        for (std::size_t each = 0; each < most; ++each) {
+            content += item;
+        }
+        for (std::size_t each = 0; each < components; ++each) {
+            content += "</Node>";
+        }
+        VDataStore store;
+        return ReadInto(store, Configuration(content))->Errors;
+    };
+
+    EXPECT_THAT(read(DataStoreFileFormat::ManyComponents), IsEmpty());
+    EXPECT_EQ(read(DataStoreFileFormat::ManyComponents + 1).size(), 1U);
+}
+
 TEST(ReadConfiguration, LooseXmlIsTaken)
 {
     VDataStore store;
