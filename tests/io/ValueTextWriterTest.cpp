@@ -108,6 +108,13 @@ TEST(ValueTextWriter, ReplacesWhatTheTextHeld)
     EXPECT_EQ("", text);
 }
 
+TEST(ValueTextWriter, RealNumbersHaveSevenAndSixteenDigitsBehindThePoint)
+{
+    EXPECT_EQ("0.1234568", WriteFloat(0.123456789f));
+    EXPECT_EQ("1.1234568", WriteFloat(1.123456789f));
+    EXPECT_EQ("0.1234567890123457", WriteDouble(0.12345678901234567));
+}
+
 TEST(ValueTextWriter, BoolInAllModes)
 {
     EXPECT_EQ((Texts{"true", "true", "true", "true", "\"true\""}),
