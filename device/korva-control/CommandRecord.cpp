@@ -42,12 +42,13 @@ public:
 
     EExitCode Run(VSession& session) override
     {
-        const VAwaitedSignals signals;
         session.Connect().GetServerInformation(); // there is a host at all
         session.Connect().Close();
+        const sockaddr_in host = HostSocketAddress(session);
+        const VAwaitedSignals signals; // until here a signal ends the program, as any other
 
         std::optional<VRecorder> recorder;
-        Record(session, recorder, signals);
+        Record(session, host, recorder, signals);
         recorder->Finish();
         return EExitCode::Done;
     }
@@ -55,10 +56,10 @@ public:
 private:
     /// @param recorder  is made once the port is taken, since a file must not suffer where it is
     /// not
-    void Record(VSession& session, std::optional<VRecorder>& recorder,
+    void Record(VSession& session, const sockaddr_in& host, std::optional<VRecorder>& recorder,
                 const VAwaitedSignals& signals) const
     {
-        FakeHost::VByteProxy proxy = TakePort(session);
+        FakeHost::VByteProxy proxy = TakePort(host);
         recorder.emplace(file, overwrite, session.Peer());
         proxy.Start([&recorder](unsigned connection) { return recorder->MakeFilter(connection); });
         std::unique_ptr<VAsyncClient> listener;
@@ -73,10 +74,9 @@ private:
                                                  : std::nullopt);
     }
 
-    FakeHost::VByteProxy TakePort(VSession& session) const
+    FakeHost::VByteProxy TakePort(const sockaddr_in& host) const
     {
         const auto port = static_cast<std::uint16_t>(listen.value_or(0));
-        const sockaddr_in host = HostSocketAddress(session);
         try {
             return FakeHost::VByteProxy(port, host);
         } catch (const std::system_error& error) {

@@ -1,7 +1,9 @@
 #include "device/ChildProgram.h"
+#include "device/ScriptedHost.h"
 
 #include <filesystem>
 #include <fstream>
+#include <future>
 #include <iterator>
 
 #include <gmock/gmock.h>
@@ -326,6 +328,22 @@ TEST(ProgramRecord, LeavesTheFileAloneWhereItsPortIsTaken)
     EXPECT_EQ(3, refused.ExitCode);
     EXPECT_THAT(refused.Errors, HasSubstr("the port cannot be taken"));
     EXPECT_EQ("precious", ReadFile(file));
+}
+
+TEST(ProgramRecord, EndsAtOnceWhileTheHostHasNotAnswered)
+{
+    std::promise<void> asked;
+    VScriptedHost host([&](VPeer& peer) {
+        peer.ReadFrame();
+        asked.set_value();
+        peer.ReadToEnd();
+    });
+    VChildProgram recorder(At(std::to_string(host.Port()), {"record", "/nowhere/file"}));
+    asked.get_future().wait();
+
+    recorder.Signal(SIGINT);
+
+    EXPECT_EQ(128 + SIGINT, recorder.Finish().ExitCode);
 }
 
 std::string RecordingOf(const std::string& request, const std::string& reply)
