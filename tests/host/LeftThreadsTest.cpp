@@ -45,3 +45,31 @@ TEST(LeftThreads, ALaterThreadIsWaitedForUpToTheLimit)
     end.set_value();
     EXPECT_TRUE(AwaitEndOfOtherThreads(before, generousLimit));
 }
+
+TEST(LeftThreads, AThreadThatWorksIsWaitedFor)
+{
+    std::thread([] {}).join();
+    const std::set<pid_t> before = OwnThreads();
+    const auto end = std::chrono::steady_clock::now() + std::chrono::milliseconds(200);
+    std::thread([end] {
+        while (std::chrono::steady_clock::now() < end) {
+        }
+    }).detach();
+
+    EXPECT_TRUE(AwaitEndOfOtherThreads(before, generousLimit));
+}
+
+TEST(LeftThreads, AThreadThatOnlyWaitsIsNotWaitedForToTheLimit)
+{
+    std::thread([] {}).join();
+    const std::set<pid_t> before = OwnThreads();
+    std::promise<void> end;
+    std::thread thread([&] { end.get_future().wait(); });
+    const auto start = std::chrono::steady_clock::now();
+
+    EXPECT_FALSE(AwaitEndOfOtherThreads(before, generousLimit));
+
+    EXPECT_LT(std::chrono::steady_clock::now() - start, generousLimit);
+    end.set_value();
+    thread.join();
+}
