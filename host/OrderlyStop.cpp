@@ -135,6 +135,9 @@ void VOrderlyStop::WatchStop()
     if (WaitReadable(done, -1, static_cast<int>(patience.count()))) {
         return;
     }
+    // From here on one signal is enough, also where the first wish came without one.
+    int none = 0;
+    static_cast<void>(signalCount.compare_exchange_strong(none, 1));
     KVR_LOG("Host", 3, "The stop is held up. %1% A second signal ends the process at once.",
             describeHolds());
     WaitReadable(done, -1, -1);

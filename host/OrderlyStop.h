@@ -13,9 +13,10 @@ namespace QuorixHost {
 ///
 /// The first wish is handed to the main thread. If the stop is not done within the patience, the
 /// log says what holds it up. A second signal ends the process at once, whatever any thread waits
-/// for. Owns: a thread, the only one that the two signals interrupt. One object in a process at a
-/// time. Threads: made and destroyed on the main thread, before any other thread is made and as the
-/// last thing of all.
+/// for; once the log has said so, the next one does, also where the first wish was a request. Owns:
+/// a thread, the only one that the two signals interrupt. One object in a process at a time.
+/// Threads: made and destroyed on the main thread, before any other thread is made and as the last
+/// thing of all.
 class VOrderlyStop
 {
 public:

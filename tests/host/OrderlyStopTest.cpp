@@ -128,6 +128,25 @@ TEST_F(OrderlyStop, SaysWhatHoldsItUpOncePatienceIsOver)
                                         "ends the process at once."));
 }
 
+TEST_F(OrderlyStop, OnceItIsHeldUpOneSignalEndsTheProcessAlsoAfterARequest)
+{
+    GTEST_FLAG_SET(death_test_style, "threadsafe");
+    const auto hold = [] {
+        std::promise<void> described;
+        VOrderlyStop stop([] {},
+                          [&] {
+                              kill(getpid(), SIGTERM); // arrives before this line is logged
+                              described.set_value();
+                              return std::string();
+                          },
+                          std::chrono::milliseconds(1));
+        stop.Request();
+        (void)described.get_future().wait_for(generousLimit);
+    };
+
+    EXPECT_EXIT(hold(), testing::ExitedWithCode(VOrderlyStop::forcedExitCode), "");
+}
+
 TEST_F(OrderlyStop, SignalsReachNoThreadThatIsMadeLater)
 {
     TestSupport::VLogCapture log;
