@@ -14,8 +14,7 @@ VConsoleLine::VConsoleLine(std::string text) : text(std::move(text)) {}
 
 std::string VConsoleLine::TakeWord(const char* what)
 {
-    SkipBlanks();
-    if (AtEnd()) {
+    if (!HasMore()) {
         throw VConsoleError(std::string("expected ") + what);
     }
     return TakePlainOrQuoted();
@@ -23,8 +22,7 @@ std::string VConsoleLine::TakeWord(const char* what)
 
 std::optional<std::pair<std::string, std::string>> VConsoleLine::TakeAssignment()
 {
-    SkipBlanks();
-    if (AtEnd()) {
+    if (!HasMore()) {
         return std::nullopt;
     }
     const std::size_t begin = position;
@@ -45,10 +43,15 @@ std::string VConsoleLine::TakeRest()
     return rest;
 }
 
-void VConsoleLine::ExpectEnd()
+bool VConsoleLine::HasMore()
 {
     SkipBlanks();
-    if (!AtEnd()) {
+    return !AtEnd();
+}
+
+void VConsoleLine::ExpectEnd()
+{
+    if (HasMore()) {
         throw VConsoleError("unexpected '" + text.substr(position) + "'");
     }
 }

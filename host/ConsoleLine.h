@@ -37,7 +37,10 @@ public:
     /// Takes all that is left, as it stands but for blanks in front.
     std::string TakeRest();
 
-    /// Throws VConsoleError where anything is left.
+    /// Returns whether anything but blanks is left.
+    bool HasMore();
+
+    /// Throws VConsoleError where anything but blanks is left.
     void ExpectEnd();
 
 private:

@@ -59,6 +59,15 @@ TEST(ConsoleLine, TakesWordsAndTheRest)
     EXPECT_THROW(line.TakeWord("a word"), VConsoleError);
 }
 
+TEST(ConsoleLine, TellsWhetherMoreThanBlanksIsLeft)
+{
+    VConsoleLine line(" one \t");
+
+    EXPECT_TRUE(line.HasMore());
+    line.TakeWord("a word");
+    EXPECT_FALSE(line.HasMore());
+}
+
 TEST(ConsoleLine, AQuotedWordHoldsBlanksQuotesAndBackslashes)
 {
     VConsoleLine line(R"("a b" "\"\\\n" "")");
