@@ -117,6 +117,23 @@ TEST(Interning, PlainTypeIsFoundForASchemaWithDocsAndDetail)
     EXPECT_TRUE(GetUniquePodSchema(EType::String).Docs.empty());
 }
 
+TEST(Interning, ASchemaIsPlainOnlyIfItHasItsTypeAlone)
+{
+    std::vector<ISchema> schemas(5, Plain(EType::Enum32));
+    schemas[0].Role = ERole::Input;
+    schemas[1].Count = 1;
+    schemas[2].TypeName = "E";
+    schemas[3].EnumValues = {{"a", 0}};
+    schemas[4].SubSchemas = {{"", Plain(EType::Bool)}};
+
+    std::set<const ISchema*> instances{&GetUniquePodSchema(EType::Enum32)};
+    for (const ISchema& schema : schemas) {
+        instances.insert(&GetUniqueSchema(schema));
+    }
+
+    EXPECT_EQ(1 + schemas.size(), instances.size());
+}
+
 TEST(Interning, UnknownTypeIsASchemaOfItsNumber)
 {
     const auto unknown = static_cast<EType>(200);
