@@ -13,6 +13,7 @@
 
 #include <chrono>
 #include <csignal>
+#include <cstdlib>
 #include <exception>
 #include <iostream>
 
@@ -83,6 +84,9 @@ int main(int argumentCount, char** arguments)
 
     // A device, or whoever reads the console's answers, may go away at any time.
     std::signal(SIGPIPE, SIG_IGN);
+    // Avahi tells whoever uses it through this interface to use another one, in three lines on
+    // standard error. Nobody at the host can, and they hide what the host has to say.
+    setenv("AVAHI_COMPAT_NOWARN", "1", 0);
     const DebugServices::VCrashHandlerForThread crashHandler;
     for (const auto& [category, level] : commandLine.options->logLevels) {
         DebugServices::SetLogLevel(category, level);
