@@ -46,10 +46,9 @@ ReaderPointer BuildRemovedMember(const ISchema& stored)
     return reader;
 }
 
-ReaderPointer BuildMember(const ISchema& current, const ReaderBuildNode& node,
+ReaderPointer BuildMember(const ISchema& current, std::size_t index, const ReaderBuildNode& node,
                           const ISchema::SubSchema& stored)
 {
-    const std::size_t index = Detail::FindMember(current, stored.first);
     if (index == Detail::NoMember) {
         return BuildRemovedMember(stored.second);
     }
@@ -63,8 +62,10 @@ ReaderPointer BuildMember(const ISchema& current, const ReaderBuildNode& node,
 bool BuildMembers(const ISchema& current, const ReaderBuildNode& node, const ISchema& stored,
                   std::vector<ReaderPointer>& readers)
 {
+    const Detail::VMemberIndex currentMembers(current);
     for (const ISchema::SubSchema& member : stored.SubSchemas) {
-        if (!Append(readers, BuildMember(current, node, member))) {
+        const std::size_t index = currentMembers.Find(member.first);
+        if (!Append(readers, BuildMember(current, index, node, member))) {
             return false;
         }
     }

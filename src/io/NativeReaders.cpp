@@ -407,9 +407,10 @@ void FindUnmappableEnums(const ISchema& stored, const ISchema& current,
         return;
     }
     const bool isNamed = stored.Type == EType::NamedTuple;
+    const VMemberIndex storedMembers(stored);
     for (std::size_t i = 0; i < current.SubSchemas.size(); ++i) {
         const ISchema::SubSchema& part = current.SubSchemas[i];
-        const std::size_t index = isNamed ? FindMember(stored, part.first) : i;
+        const std::size_t index = isNamed ? storedMembers.Find(part.first) : i;
         if (index < stored.SubSchemas.size()) { // else it is a new member
             FindUnmappableEnums(stored.SubSchemas[index].second, part.second, errors,
                                 path + (isNamed ? NameStep(part.first) : IndexStep(i)));

@@ -101,10 +101,11 @@ private:
 
     void CompareMembers(const ISchema& stored, const ISchema& current, const std::string& path)
     {
+        const Detail::VMemberIndex storedMembers(stored);
         TellRemovedMembers(stored, current, path);
-        TellAddedAndMovedMembers(stored, current, path);
+        TellAddedAndMovedMembers(storedMembers, current, path);
         for (const ISchema::SubSchema& member : current.SubSchemas) {
-            const std::size_t index = Detail::FindMember(stored, member.first);
+            const std::size_t index = storedMembers.Find(member.first);
             if (index != Detail::NoMember) {
                 Compare(stored.SubSchemas[index].second, member.second,
                         member.first.empty() ? path : path + "." + member.first);
@@ -114,20 +115,21 @@ private:
 
     void TellRemovedMembers(const ISchema& stored, const ISchema& current, const std::string& path)
     {
+        const Detail::VMemberIndex currentMembers(current);
         for (const ISchema::SubSchema& member : stored.SubSchemas) {
-            if (Detail::FindMember(current, member.first) == Detail::NoMember) {
+            if (currentMembers.Find(member.first) == Detail::NoMember) {
                 warnings.push_back(path + "." + member.first + " member was removed.");
             }
         }
     }
 
-    void TellAddedAndMovedMembers(const ISchema& stored, const ISchema& current,
+    void TellAddedAndMovedMembers(const Detail::VMemberIndex& stored, const ISchema& current,
                                   const std::string& path)
     {
         bool toldOrder = false;
         std::size_t lastIndex = 0;
         for (const ISchema::SubSchema& member : current.SubSchemas) {
-            const std::size_t index = Detail::FindMember(stored, member.first);
+            const std::size_t index = stored.Find(member.first);
             if (index == Detail::NoMember) {
                 warnings.push_back(path + "." + member.first + " member was added.");
                 continue;
@@ -186,13 +188,17 @@ void CompareSchemas(const ISchema& stored, const ISchema& current,
 
 namespace Detail {
 
-std::size_t FindMember(const ISchema& schema, const std::string& name)
+VMemberIndex::VMemberIndex(const ISchema& schema)
 {
-    const auto found = std::find_if(schema.SubSchemas.begin(), schema.SubSchemas.end(),
-                                    [&](const ISchema::SubSchema& m) { return m.first == name; });
-    return found == schema.SubSchemas.end()
-               ? NoMember
-               : static_cast<std::size_t>(found - schema.SubSchemas.begin());
+    for (std::size_t i = 0; i < schema.SubSchemas.size(); ++i) {
+        indices.emplace(schema.SubSchemas[i].first, i); // keeps the first
+    }
+}
+
+std::size_t VMemberIndex::Find(const std::string& name) const
+{
+    const auto found = indices.find(name);
+    return found == indices.end() ? NoMember : found->second;
 }
 
 } // namespace Detail

@@ -2,7 +2,10 @@
 
 #include "io/ISchema.h"
 
+#include <cstddef>
 #include <string>
+#include <string_view>
+#include <unordered_map>
 #include <vector>
 
 namespace KVR {
@@ -35,8 +38,20 @@ namespace Detail {
 
 constexpr std::size_t NoMember = ~std::size_t{0};
 
-/// Returns the index of the first member of that name, compared exactly, or NoMember.
-std::size_t FindMember(const ISchema& schema, const std::string& name);
+/// Finds the members of a tuple, by the exact name and of equal ones the first.
+///
+/// The schema must outlive it and not change. Threads: a plain value.
+class VMemberIndex
+{
+public:
+    explicit VMemberIndex(const ISchema& schema);
+
+    /// Returns the index of the member, or NoMember.
+    std::size_t Find(const std::string& name) const;
+
+private:
+    std::unordered_map<std::string_view, std::size_t> indices;
+};
 
 } // namespace Detail
 } // namespace IO

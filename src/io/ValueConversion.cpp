@@ -13,6 +13,7 @@
 #include <map>
 #include <stdexcept>
 #include <string>
+#include <unordered_map>
 #include <utility>
 
 namespace KVR {
@@ -267,8 +268,10 @@ private:
     bool ConvertMembers(const ISchema& stored, const ISchema& current, ByteVector& result)
     {
         std::vector<std::pair<bool, ByteVector>> members(current.SubSchemas.size());
+        const Detail::VMemberIndex& currentMembers =
+            memberIndices.try_emplace(&current, current).first->second;
         for (const ISchema::SubSchema& member : stored.SubSchemas) {
-            const std::size_t index = Detail::FindMember(current, member.first);
+            const std::size_t index = currentMembers.Find(member.first);
             if (index == Detail::NoMember) {
                 if (!Skip(member.second)) {
                     return false;
@@ -309,6 +312,7 @@ private:
 
     Detail::VVectorReader& cursor;
     std::map<std::pair<const ISchema*, const ISchema*>, EnumMapping> mappings;
+    std::unordered_map<const ISchema*, Detail::VMemberIndex> memberIndices;
 };
 
 } // namespace

@@ -5,6 +5,7 @@
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <map>
 #include <set>
 
@@ -362,4 +363,24 @@ TEST(SchemaComparison, DoesNotLookAtRoleTypeNameDetailAndDocs)
     current.Docs = {"changed"};
 
     ExpectDifference(Plain(EType::Int8), current, {}, {});
+}
+
+/// Looked for one by one, so many members would not end within the test's time.
+TEST(SchemaComparison, FindsTheMembersOfAGreatTuple)
+{
+    ISchema stored = NamedTupleOf({});
+    for (std::size_t i = 0; i < 200000; ++i) {
+        stored.SubSchemas.emplace_back("m" + std::to_string(i), Plain(EType::Int8));
+    }
+    ISchema current = stored;
+    std::reverse(current.SubSchemas.begin(), current.SubSchemas.end());
+    current.SubSchemas.front().first = "new";
+    // Of equal names the first counts.
+    current.SubSchemas.emplace_back("m7", Plain(EType::Bool));
+    stored.SubSchemas.emplace_back("m8", Plain(EType::Bool));
+
+    ExpectDifference(
+        stored, current,
+        {".m199999 member was removed.", ".new member was added.", ": members were re-ordered"},
+        {".m7: Type changed from Int8 to Bool."});
 }

@@ -7,6 +7,8 @@
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
+
 using namespace KVR::IO;
 
 namespace {
@@ -161,4 +163,20 @@ TEST(ValueConversion, GivesWhatTheTextModelGives)
             ASSERT_EQ(refused, Converted(stored, bytes, current)) << "seed " << seed;
         }
     }
+}
+
+/// Looked for one by one, so many members would not end within the test's time.
+TEST(ValueConversion, FindsTheMembersOfAGreatTuple)
+{
+    ISchema stored = NamedTupleOf({});
+    ByteVector bytes;
+    for (std::size_t i = 0; i < 200000; ++i) {
+        stored.SubSchemas.emplace_back("m" + std::to_string(i), int8Schema);
+        bytes.push_back(static_cast<unsigned char>(i % 251));
+    }
+    ISchema current = stored;
+    std::reverse(current.SubSchemas.begin(), current.SubSchemas.end());
+    const ByteVector expected(bytes.rbegin(), bytes.rend());
+
+    EXPECT_EQ(expected, Converted(stored, bytes, current));
 }
