@@ -8,6 +8,7 @@
 
 #include <gmock/gmock.h>
 
+#include <atomic>
 #include <stdexcept>
 #include <thread>
 
@@ -220,6 +221,38 @@ TEST_F(AuthorizationEnd, ACheckThatHasEndedIsNotScheduledAgain)
 
     EXPECT_TRUE(view.IsConnected("other"));
     EXPECT_EQ(1U, timers.CountMade());
+}
+
+TEST_F(AuthorizationEnd, ACheckThatComesAfterItsEndDoesNothing)
+{
+    Make();
+    Ask("id");
+    const auto timer = timers.Last(); // it has expired, and its function is on its way
+    manager->EndHeartbeatCheck();
+    clock.Advance(4000);
+
+    EXPECT_TRUE(KVR::GuardedCall(timer->Function));
+
+    EXPECT_TRUE(view.IsConnected("id"));
+}
+
+TEST_F(AuthorizationEnd, TheChecksThreadIsWaitedFor)
+{
+    Make();
+    Ask("id");
+    NotificationTest::VLatch ending;
+    std::atomic<bool> left{false};
+    timers.Last()->Service->Post(
+        [&] {
+            ending.Wait();
+            left = true;
+        },
+        0);
+
+    ending.CountDown();
+    manager->EndHeartbeatCheck();
+
+    EXPECT_TRUE(left);
 }
 
 namespace {
