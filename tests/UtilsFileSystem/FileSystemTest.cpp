@@ -101,6 +101,24 @@ TEST(FileSystem, OpensThroughStreams)
     EXPECT_TRUE(missing.fail());
 }
 
+TEST(FileSystem, OpensInTheModeThatIsAskedFor)
+{
+    const VTemporaryFolder folder;
+    WriteFile(folder.Path("f"), "old");
+    std::ofstream appending, refused;
+    std::ifstream atTheEnd;
+
+    OpenOutput(appending, folder.Path("f"), std::ios_base::app);
+    appending << " and new";
+    appending.close();
+    OpenInput(atTheEnd, folder.Path("f"), std::ios_base::ate);
+    OpenOutput(refused, folder.Path(), std::ios_base::out);
+
+    EXPECT_EQ(ContentOf(folder.Path("f")), "old and new");
+    EXPECT_EQ(atTheEnd.tellg(), std::streamoff(11));
+    EXPECT_TRUE(refused.fail());
+}
+
 TEST(FileSystem, EnsuresAFolderWithItsParents)
 {
     const VTemporaryFolder folder;

@@ -1,10 +1,13 @@
 #include "UtilsFileSystem/ReplaceFile.h"
+#include "support/ChildProcess.h"
 #include "support/TemporaryFolder.h"
 #include "support/TracedProcess.h"
 
-#include <gtest/gtest.h>
+#include <gmock/gmock.h>
 
 #include <filesystem>
+#include <functional>
+#include <sys/stat.h>
 
 using TestSupport::ContentOf;
 using TestSupport::VTemporaryFolder;
@@ -68,12 +71,10 @@ TEST(ReplaceFileCrash, DoesNotHinderTheNextOne)
 }
 
 #ifdef __x86_64__
-TEST(ReplaceFileCrash, WaitsForTheDiskBeforeTheFileTakesItsPlaceAndAfterwards)
+/// Runs the work to its end. @return its writes, waits for the disk and moves of files, in order
+std::string CallsOf(const std::function<void()>& work)
 {
-    const VTemporaryFolder folder;
-    WriteFile(folder.Path("file"), oldContent);
-    TestSupport::VTracedProcess process([&] { ReplaceFile(folder.Path("file"), newContent); });
-
+    TestSupport::VTracedProcess process(work);
     std::string calls;
     while (process.Step()) {
         if (process.IsBeforeWrite()) {
@@ -84,8 +85,36 @@ TEST(ReplaceFileCrash, WaitsForTheDiskBeforeTheFileTakesItsPlaceAndAfterwards)
             calls += "move ";
         }
     }
+    return process.HasSucceeded() ? calls : calls + "and failed";
+}
 
-    EXPECT_EQ(calls, "write wait move wait ");
+TEST(ReplaceFileCrash, WaitsForTheDiskBeforeTheFileTakesItsPlaceAndAfterwards)
+{
+    const VTemporaryFolder folder;
+    WriteFile(folder.Path("file"), oldContent);
+
+    EXPECT_EQ(CallsOf([&] { ReplaceFile(folder.Path("file"), newContent); }),
+              "write wait move wait ");
+}
+
+TEST(ReplaceFileCrash, WaitsForTheDiskWhereItReplacesInPlace)
+{
+    if (TestSupport::RunWithoutPrivileges([] { return 0; }) != 0) {
+        GTEST_SKIP() << "the kernel forbids namespaces here";
+    }
+    const VTemporaryFolder folder;
+    WriteFile(folder.Path("file"), oldContent);
+    chmod(folder.Path().c_str(), 0555);
+
+    const std::string calls = CallsOf([&] {
+        if (!TestSupport::GiveUpPrivileges() || !ReplaceFile(folder.Path("file"), newContent)) {
+            _exit(1);
+        }
+    });
+
+    chmod(folder.Path().c_str(), 0755);
+    EXPECT_THAT(calls, testing::EndsWith("write wait ")); // what comes before is the namespace's
+    EXPECT_EQ(ContentOf(folder.Path("file")), newContent);
 }
 #endif
 

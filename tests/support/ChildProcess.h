@@ -69,16 +69,19 @@ inline bool DropCapabilities()
     return syscall(SYS_capset, &header, none) == 0;
 }
 
+/// Makes the calling process one of a user without privileges.
+inline bool GiveUpPrivileges()
+{
+    constexpr unsigned ordinaryUser = 1000;
+    // Where there is no namespace to be had, as under the thread sanitizer, whose own thread
+    // forbids it, an administrator without capabilities is such a user too.
+    return (EnterUserNamespace(ordinaryUser) || geteuid() == 0) && DropCapabilities();
+}
+
 /// Runs work in a child process as a user without privileges. @return as RunInChild
 inline int RunWithoutPrivileges(const std::function<int()>& work)
 {
-    constexpr unsigned ordinaryUser = 1000;
-    return RunInChild([&] {
-        // Where there is no namespace to be had, as under the thread sanitizer, whose own thread
-        // forbids it, an administrator without capabilities is such a user too.
-        const bool isOrdinary = EnterUserNamespace(ordinaryUser) || geteuid() == 0;
-        return isOrdinary && DropCapabilities() ? work() : notAllowed;
-    });
+    return RunInChild([&] { return GiveUpPrivileges() ? work() : notAllowed; });
 }
 
 /// Runs work in a child process that has an empty file system in memory on a folder.
