@@ -219,3 +219,15 @@ TEST_F(ConsoleFire, TellsAListenersException)
 
     EXPECT_EQ("error: not heard", console.Answer("fire Event.X"));
 }
+
+TEST(Console, QuitAsksForTheStopAndTakesNoMoreWords)
+{
+    VConsole console;
+    int asked = 0;
+    QuorixHost::AddStopCommand(console, [&] { ++asked; });
+
+    EXPECT_EQ("error: unexpected 'now'", console.Answer("quit now"));
+    EXPECT_EQ(0, asked);
+    EXPECT_EQ("ok", console.Answer(" quit "));
+    EXPECT_EQ(1, asked);
+}
