@@ -5,6 +5,7 @@
 #include <gmock/gmock.h>
 
 #include <QCoreApplication>
+#include <QPointer>
 #include <QSignalSpy>
 #include <QSocketNotifier>
 
@@ -239,6 +240,19 @@ TEST_F(BonjourRegistrar, ItsEndWithdrawsTheAdvertisement)
     registrar.reset();
 
     EXPECT_EQ(1, library.Deallocated);
+}
+
+TEST_F(BonjourRegistrar, ItsEndLetsGoOfTheSocketBeforeTheLibraryClosesIt)
+{
+    emit registrar->Register("Name");
+    const QPointer<QSocketNotifier> notifier = registrar->findChild<QSocketNotifier*>();
+    ASSERT_FALSE(notifier.isNull());
+    bool isWatched = true;
+    library.OnDeallocate = [&] { isWatched = !notifier.isNull(); };
+
+    registrar.reset();
+
+    EXPECT_FALSE(isWatched);
 }
 
 TEST_F(BonjourRegistrar, ItsEndWithoutARegistrationWithdrawsNothing)

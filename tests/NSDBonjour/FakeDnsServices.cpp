@@ -100,5 +100,8 @@ DNSServiceErrorType VFakeDnsServices::ProcessResult(DNSServiceRef service)
 void VFakeDnsServices::RefDeallocate(DNSServiceRef service)
 {
     EXPECT_EQ(Reference(), service);
+    if (current->OnDeallocate) {
+        current->OnDeallocate();
+    }
     ++current->Deallocated;
 }

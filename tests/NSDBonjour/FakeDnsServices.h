@@ -5,6 +5,7 @@
 #include <QString>
 
 #include <cstdint>
+#include <functional>
 #include <optional>
 #include <string>
 #include <thread>
@@ -55,6 +56,7 @@ public:
     DNSServiceErrorType ProcessAnswer = 0;
     int ResultsBeforeCallBack = -1; // negative: never calls back
     DNSServiceErrorType CallBackError = 0;
+    std::function<void()> OnDeallocate; // called before the reference counts as gone
 
     // What it was asked.
     std::vector<VRegistration> Registrations;

@@ -257,9 +257,14 @@ TEST(QuickWidget, AGoodFileAfterABrokenOneIsShown)
 
 TEST(QuickWidget, ARootThatIsNoItemLeavesTheViewEmpty)
 {
-    VQmlView view("QtObject {}");
+    QObject log;
+    VQmlView view;
+    view.Widget().QmlContext().setContextProperty("log", &log);
+
+    view.Show("QtObject { Component.onDestruction: log.objectName = 'destroyed' }");
 
     EXPECT_EQ(nullptr, view.Root());
+    EXPECT_EQ("destroyed", log.objectName()); // nobody else would ever do it
 }
 
 TEST(QuickWidget, NothingComplainsWhenAViewCloses)
