@@ -90,11 +90,12 @@ public:
     /// Returns the youngest timer, empty where nobody holds it.
     std::shared_ptr<VTimer> Last() const { return made.empty() ? nullptr : made.back().lock(); }
 
-    /// Lets the youngest timer expire. @return false where nobody holds it
+    /// Lets the youngest timer expire. @return false where nobody holds it or it has expired before
     bool Fire()
     {
         const std::shared_ptr<VTimer> timer = Last();
-        return timer && KVR::GuardedCall(timer->Function);
+        return timer && !timer->Function.empty() &&
+               KVR::GuardedCall(std::exchange(timer->Function, boost::function<void()>()));
     }
 
     std::size_t CountMade() const { return made.size(); }
