@@ -201,6 +201,52 @@ TEST_F(DataStoreCommit, RestoringFlagsMovesTheRecordedValueBack)
     EXPECT_EQ(2, Verified(reader, "A"));
 }
 
+TEST_F(DataStoreCommit, RestoreGoesByThePendingFlags)
+{
+    SetVerifiable("A", 7, 3);
+    {
+        VDataVerifyWriter writer(store);
+        writer.RemoveAllRestorable(VDataPath("A"));
+        EXPECT_TRUE(writer.SetValue(Token("A"), Byte(8)));
+        EXPECT_TRUE(writer.SetFlags(Token("A"), 0)); // makes the recorded value a verified one
+        EXPECT_TRUE(writer.SetValue(Token("A"), Byte(7)));
+        EXPECT_EQ(8, Current(writer, "A")) << "dropped: the committed verified value is another";
+        EXPECT_TRUE(writer.SetValue(Token("A"), Byte(3)));
+        EXPECT_EQ(7, Current(writer, "A")) << "restored, and read by the committed flags";
+    }
+    EXPECT_EQ(7, Verified(VDataVerifyReader(store), "A"));
+}
+
+TEST_F(DataStoreCommit, RemovalForgetsTheFlagsThatWereRecorded)
+{
+    Set("A", Byte(1));
+    Listen("A");
+    {
+        VDataWriter writer(store);
+        writer.SetFlags(Token("A"), 4);
+        EXPECT_TRUE(writer.Remove(Token("A")));
+        EXPECT_TRUE(writer.SetValue(Token("A"), Byte(2)));
+        EXPECT_EQ(0, Flags(writer, "A"));
+    }
+    EXPECT_EQ((Texts{"A verified", "A any"}), Fired());
+    EXPECT_EQ(0, Flags(VDataReader(store), "A"));
+}
+
+TEST_F(DataStoreCommit, RecordedFlagsOutliveARestoredValue)
+{
+    Set("A", Byte(1));
+    {
+        VDataWriter writer(store);
+        writer.RemoveAllRestorable(VDataPath("A"));
+        EXPECT_TRUE(writer.SetValue(Token("A"), Byte(2)));
+        EXPECT_TRUE(writer.SetFlags(Token("A"), 4));
+        EXPECT_TRUE(writer.SetValue(Token("A"), Byte(1)));
+        EXPECT_EQ(4, Flags(writer, "A")) << "the record stays for its flags";
+    }
+    EXPECT_EQ(4, Flags(VDataReader(store), "A"));
+    EXPECT_EQ(1, Current(VDataReader(store), "A"));
+}
+
 TEST_F(DataStoreCommit, RestoreOfOneOfTwoValuesKeepsTheOther)
 {
     SetVerifiable("A", 7, 3);

@@ -124,6 +124,18 @@ TEST_F(DataStore, PendingFlagsMoveThePendingValue)
     EXPECT_EQ(-1, Verified(reader, "A"));
 }
 
+TEST_F(DataStore, CommittedValueIsReadByTheCommittedFlags)
+{
+    SetVerifiable("A", 7, 3);
+    {
+        VDataVerifyWriter writer(store);
+        EXPECT_TRUE(writer.SetFlags(Token("A"), 0));
+        EXPECT_EQ(7, Current(writer, "A"));
+        EXPECT_EQ(3, Verified(writer, "A"));
+    }
+    EXPECT_EQ(7, Current(VDataReader(store), "A")) << "the value moves at the commit";
+}
+
 TEST_F(DataStore, TwoTruthsOfAnItem)
 {
     SetVerifiable("A", 7, 3);

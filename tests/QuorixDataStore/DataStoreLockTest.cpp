@@ -40,6 +40,12 @@ TEST_F(DataStoreLock, ReleaseWithoutALockChangesNothing)
     EXPECT_EQ(1u, store.GetLocks().size()) << "nor is another thread's";
     store.ReleaseReadLock();
     EXPECT_TRUE(store.GetLocks().empty());
+
+    VDataWriter writer(store);
+    store.ReleaseReadLock();
+    ASSERT_EQ(1u, store.GetLocks().size());
+    EXPECT_EQ(0u, store.GetLocks()[0].ReadLocks);
+    EXPECT_EQ(1u, store.GetLocks()[0].WriteLocks);
 }
 
 TEST_F(DataStoreLock, ReadLockIsNeverUpgraded)

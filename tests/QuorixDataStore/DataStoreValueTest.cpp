@@ -301,6 +301,19 @@ TEST_F(DataStore, RemoveAllTakesWhatThePathNames)
     EXPECT_EQ((Texts{"B"}), Find(VDataReader(store), "*"));
 }
 
+TEST_F(DataStore, RemoveAllIsNotRestorable)
+{
+    Set("A", Byte(1));
+    Listen("A");
+    {
+        VDataWriter writer(store);
+        writer.RemoveAll(VDataPath("A"));
+        writer.SetValue(Token("A"), Byte(1));
+    }
+
+    EXPECT_EQ((Texts{"A verified", "A any"}), Fired());
+}
+
 TEST_F(DataStore, SetValuesWritesEveryItemOfThePath)
 {
     SetItems({"A.B", "A.C", "B"});

@@ -77,6 +77,11 @@ const auto& Pick(std::mt19937& random, const Choices& choices)
 Names RandomPath(std::mt19937& random, bool wildcards)
 {
     static const std::vector<std::string> names{"A", "B", "C"};
+    // Rules about one item need several steps on it within a scope.
+    static const std::vector<Names> busyItems{{"A"}, {"A", "B"}};
+    if (!wildcards && random() % 2 == 0) {
+        return Pick(random, busyItems);
+    }
     Names path;
     const std::size_t count = random() % 20 == 0 ? 0 : 1 + random() % 3;
     for (std::size_t index = 0; index < count; ++index) {
