@@ -1,13 +1,17 @@
 #include "../PluginBench.h"
 #include "ControlSystem.h"
+#include "DebugServices/Clock.h"
+#include "QuorixDataStore/DataListeners.h"
 #include "QuorixDataStore/DataReader.h"
 #include "QuorixDataStore/DataStore.h"
 #include "QuorixDataStore/DataWriter.h"
 #include "io/Values.h"
 #include "notification/GuardedCall.h"
 #include "notification/IPostalService.h"
+#include "notification/Support.h"
 
 #include <gmock/gmock.h>
+#include <poll.h>
 
 #include <atomic>
 #include <chrono>
@@ -195,6 +199,34 @@ TEST_F(AuthorizationPlugin, EveryDeviceHearsOfTheEndAlsoWithCommandsOnTheirWay)
         StartHost();
     }
     StopHost();
+}
+
+TEST_F(AuthorizationPlugin, EveryDeviceHearsOfTheEndAlsoWithACheckOnItsWay)
+{
+    constexpr int stale = 3500; // milliseconds, so that the check has something to write
+    const auto device = Connect();
+    device->Send(AuthorizeFrame("0"));
+    device->ReadFrame(); // pending, so the step waits by now
+    postal->Deliver();
+    device->ReadFrame(); // authorized
+    NotificationTest::VLatch checking, ending;
+    VDataListeners& listeners = VDataWriter(*store).GetListeners(VDataPath("Control.0.Connected"));
+    const std::uint64_t id = listeners.OnVerifiedChanged.Add([&] {
+        checking.CountDown();
+        ending.Wait();
+        // For as long as it takes to end without it, which would close the connection.
+        pollfd closed{device->Descriptor(), POLLIN, 0};
+        poll(&closed, 1, 200);
+    });
+    DebugServices::AdvanceClock(stale);
+    EXPECT_TRUE(checking.Wait());
+
+    ending.CountDown();
+    StopHost();
+
+    EXPECT_EQ(disconnect, device->ReadToEnd());
+    listeners.OnVerifiedChanged.Remove(id);
+    DebugServices::AdvanceClock(-stale);
 }
 
 TEST_F(AuthorizationPlugin, TheListsAreReadAtStartAndWrittenAtTheEnd)
