@@ -8,9 +8,21 @@ Item {
     id: root
     objectName: "authorizationRoot"
 
+    // Room for two lines of the question and of the check box, however large the font: it asks for
+    // more than the dialog's least size only where that would cut the question short.
+    implicitWidth: 24 * line.implicitHeight
+    implicitHeight: 4 * line.implicitHeight + buttonDeny.height + 5 * Theme.margin
+
     // The keyboard is with the view but with no button: a key that was meant for another window when
     // this one came up answers nothing.
     focus: true
+
+    Text {
+        id: line
+        visible: false // only measured
+        text: "Control"
+        font: label.font
+    }
 
     Rectangle {
         id: backgroundRect

@@ -202,6 +202,8 @@ TEST_P(DialogLayout, PutsTheDenyingButtonInTheCorner)
     EXPECT_EQ(margin, deny.left() - allow.right());
     EXPECT_EQ(allow.width(), deny.width());
     EXPECT_EQ(margin, PlaceOf(ItemOf(dialog, "image")).left());
+    EXPECT_EQ(1, ItemOf(dialog, "image").property("fillMode").toInt()); // keeps its proportions
+    EXPECT_EQ(QUrl("qrc:/images/ControlLogo.svg"), ItemOf(dialog, "image").property("source"));
 }
 
 INSTANTIATE_TEST_SUITE_P(Sets, ManagementLayout, testing::Bool(),
@@ -258,6 +260,37 @@ TEST_P(ManagementLayout, ScrollsAFullListAndNeverSideways)
     EXPECT_LE(list.property("contentWidth").toReal(), list.width());
     ExpectApart(*dialog, FindAll(*dialog, {"heading", "resetButton", "scrollView", "buttonOk",
                                            "buttonCancel"}));
+}
+
+/// With the desktop's font of another size.
+class DialogFonts : public TestSupport::VDialogs, public testing::WithParamInterface<int>
+{
+protected:
+    DialogFonts()
+    {
+        QFont font = before;
+        font.setPointSize(GetParam());
+        QApplication::setFont(font);
+    }
+    ~DialogFonts() override { QApplication::setFont(before); }
+
+private:
+    const QFont before = QApplication::font();
+};
+
+INSTANTIATE_TEST_SUITE_P(Layout, DialogFonts, testing::Values(6, 9, 12, 14));
+
+TEST_P(DialogFonts, CutNoOrdinaryQuestionShort)
+{
+    VQuorixControlAuthorizationDialog dialog(TestSupport::MakeQuickContext(),
+                                             "Tablet of the second unit", true);
+    dialog.setAttribute(Qt::WA_DeleteOnClose, false);
+    TestSupport::Show(dialog);
+    KeepPicture(dialog, "authorization-" + std::to_string(GetParam()) + "-points");
+
+    EXPECT_FALSE(ItemOf(dialog, "label").property("truncated").toBool());
+    ExpectApart(dialog,
+                FindAll(dialog, {"image", "label", "checkRemember", "buttonAllow", "buttonDeny"}));
 }
 
 class DialogImages : public testing::TestWithParam<std::tuple<const char*, int, bool>>

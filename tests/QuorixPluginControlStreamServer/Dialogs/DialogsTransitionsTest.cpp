@@ -91,6 +91,48 @@ TEST_F(ManagementTransitions, RowsMoveUpAndAreWholeAgain)
     EXPECT_EQ(1.0, animations[1].to);
 }
 
+TEST_F(ManagementTransitions, TheListHasNoHorizontalScrollBar)
+{
+    QQuickItem& view = ItemOf(dialog, "scrollView");
+
+    EXPECT_EQ(true, QQmlExpression(qmlContext(&view), &view,
+                                   "ScrollBar.horizontal.policy === ScrollBar.AlwaysOff")
+                        .evaluate());
+}
+
+TEST_F(ManagementTransitions, AButtonComesUpWithinTheSameTime)
+{
+    authorization->SetDevices({{"1", {true, "Alto"}}});
+    const VQuorixControlManagementDialog filled(context, authorization);
+    std::vector<int> durations;
+    for (QObject* const child : ItemOf(filled, "forgetButton").findChildren<QObject*>()) {
+        if (child->inherits("QQuickBehavior")) {
+            qmlExecuteDeferred(child); // else it waits for its first run
+            const auto* const animation = child->property("animation").value<QObject*>();
+            durations.push_back(animation->property("duration").toInt());
+        }
+    }
+
+    EXPECT_EQ(std::vector<int>{300}, durations);
+}
+
+TEST_F(ManagementTransitions, ARowHasTheThemesColourAndItsImages)
+{
+    authorization->SetDevices({{"1", {true, "Alto"}}});
+    const VQuorixControlManagementDialog filled(context, authorization);
+    QQuickItem& row = ItemOf(filled, "rect");
+    const auto source = [&row](const char* image) {
+        return ItemOf(row, image).property("source").toUrl().toString().toStdString();
+    };
+
+    EXPECT_EQ(
+        true,
+        QQmlExpression(qmlContext(&row), &row, "Qt.colorEqual(color, Theme.window)").evaluate());
+    EXPECT_EQ("qrc:/images/ControlIcon.svg", source("imageControl"));
+    EXPECT_EQ("qrc:/images/ControlAllowed.svg", source("imageAllowed"));
+    EXPECT_EQ("qrc:/images/ControlBanned.svg", source("imageBanned"));
+}
+
 TEST_F(ManagementTransitions, RowsAreAMarginApart)
 {
     VQuorixControlManagementDialog shown(context, authorization);
