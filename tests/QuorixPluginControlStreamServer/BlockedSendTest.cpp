@@ -94,6 +94,22 @@ TEST_F(BlockedSend, DoesNotKeepTheConnectionFromReading)
     connection->Close();
 }
 
+bool IsAllRead(int descriptor)
+{
+    int unread = 0;
+    return ::ioctl(descriptor, FIONREAD, &unread) != 0 || unread == 0;
+}
+
+bool IsClosing(int descriptor)
+{
+    tcp_info info{};
+    socklen_t size = sizeof info;
+    return ::getsockopt(descriptor, IPPROTO_TCP, TCP_INFO, &info, &size) != 0 ||
+           info.tcpi_state != TCP_ESTABLISHED;
+}
+
+using Closing = VConnectionFixture;
+
 /// A device that sends without end, whose messages are not read any more.
 class LastBytes : public VConnectionFixture
 {
@@ -162,10 +178,7 @@ TEST_F(LastBytes, AreWaitedForWithNothingDeliveredAnyMore)
     connection->Send(std::wstring(std::size_t{64} * 1024, L'x'));
     const int descriptor = OtherEndOf(client);
     std::thread closing([this] { connection->Close(); });
-    EXPECT_TRUE(BecomesTrue([descriptor] {
-        int unread = 0;
-        return ::ioctl(descriptor, FIONREAD, &unread) != 0 || unread == 0;
-    }));
+    EXPECT_TRUE(BecomesTrue([descriptor] { return IsAllRead(descriptor); }));
 
     held.Open();
     while (client.SendFrame("late")) {
@@ -173,6 +186,26 @@ TEST_F(LastBytes, AreWaitedForWithNothingDeliveredAnyMore)
 
     closing.join();
     EXPECT_EQ(std::vector<std::wstring>{L"holds the reading"}, messages.Wait(1));
+}
+
+/// Either the wait or the reading gets the rest of a frame, so that one round may prove nothing.
+TEST_F(Closing, DeliversNoFrameWhoseRestComesMeanwhile)
+{
+    for (std::size_t round = 0; round < 10; ++round) {
+        VRawClient device(socket->Port(), SmallBuffer);
+        const std::shared_ptr<IClientConnection> connection = ConnectionOf(round).lock();
+        const int descriptor = OtherEndOf(device);
+        connection->Send(std::wstring(std::size_t{64} * 1024, L'x'));
+        device.Send(TestSupport::Frame("half").substr(0, 6));
+        EXPECT_TRUE(BecomesTrue([descriptor] { return IsAllRead(descriptor); }));
+        std::thread closing([&connection] { connection->Close(); });
+        EXPECT_TRUE(BecomesTrue([descriptor] { return IsClosing(descriptor); }));
+
+        device.Send("lf");
+
+        closing.join();
+    }
+    EXPECT_TRUE(messages.All().empty());
 }
 
 } // namespace
