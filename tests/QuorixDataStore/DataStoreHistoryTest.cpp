@@ -13,7 +13,8 @@ using namespace StoreTest;
 // for each outermost write lock; each listener fires at most once per kind and commit, in the order
 // of kinds, on the thread that let go last; a write of the visible value records nothing; restored
 // values fire nothing; a false result leaves everything as it was; no update is lost but the second
-// write after a restorable removal; nobody waits for ever.
+// write after a restorable removal; an item keeps its schema; a listener that throws stops no
+// other; nobody waits for ever.
 //
 // A seed that fails is printed. QUORIX_SEED=<it> plays that one alone.
 
