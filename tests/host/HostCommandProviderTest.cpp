@@ -85,7 +85,7 @@ TEST(HostCommandProvider, DescribesEachCommandAndItsParameters)
 
     const auto information = provider.GetCommandInformation(L"Host.Information");
     EXPECT_EQ(L"Host.Information", information.Name);
-    EXPECT_THAT(information.Description, Not(IsEmpty()));
+    EXPECT_EQ(L"Tells which host this is and which cameras it has.", information.Description);
     EXPECT_THAT(information.InputParameters, IsEmpty());
     std::vector<std::wstring> names;
     for (const auto& parameter : information.ReplyParameters) {
@@ -96,7 +96,7 @@ TEST(HostCommandProvider, DescribesEachCommandAndItsParameters)
 
     const auto echo = provider.GetCommandInformation(L"Host.Echo");
     EXPECT_EQ(L"Host.Echo", echo.Name);
-    EXPECT_THAT(echo.Description, Not(IsEmpty()));
+    EXPECT_EQ(L"Sends every parameter back as it came.", echo.Description);
     EXPECT_EQ(1U, echo.InputParameters.size());
     EXPECT_EQ(1U, echo.ReplyParameters.size());
 }
