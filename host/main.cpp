@@ -4,6 +4,7 @@
 #include "Options.h"
 #include "QuorixVersion.h"
 #include "utils/LogStatement.h"
+#include "utils/StandardStreams.h"
 #include "window/DisplayCheck.h"
 #include "window/HostWindow.h"
 #include "window/WindowLog.h"
@@ -76,6 +77,7 @@ int RunWithWindow(const QuorixHost::VOptions& options, int& argumentCount, char*
 
 int main(int argumentCount, char** arguments)
 {
+    KVR::FillStandardStreams();
     const QuorixHost::VCommandLine commandLine =
         QuorixHost::ParseCommandLine(argumentCount, arguments, std::cout, std::cerr);
     if (!commandLine.options) {

@@ -4,12 +4,12 @@
 #include "korva-control/TerminalText.h"
 
 #include "QuorixVersion.h"
+#include "utils/StandardStreams.h"
 
 #include <algorithm>
 #include <exception>
 
 #include <CLI/CLI.hpp>
-#include <fcntl.h>
 #include <unistd.h>
 
 namespace {
@@ -120,23 +120,10 @@ EExitCode Run(int argc, char** argv)
     return EExitCode::WrongUsage;
 }
 
-/// Fills the places of standard streams that were closed: else the connection would get one of
-/// them, and what is printed would go to the host. Nothing can be written there, and nothing read.
-void FillStandardStreams()
-{
-    int descriptor = 0;
-    do {
-        descriptor = open("/dev/null", O_RDONLY);
-    } while (descriptor >= 0 && descriptor <= STDERR_FILENO);
-    if (descriptor > STDERR_FILENO) {
-        close(descriptor);
-    }
-}
-
 } // namespace
 
 int main(int argc, char** argv)
 {
-    FillStandardStreams();
+    KVR::FillStandardStreams();
     return static_cast<int>(Run(argc, argv));
 }
