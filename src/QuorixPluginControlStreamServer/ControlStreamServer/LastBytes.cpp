@@ -1,6 +1,7 @@
 #include "QuorixPluginControlStreamServer/ControlStreamServer/LastBytes.h"
 
 #include <array>
+#include <atomic>
 #include <cerrno>
 #include <cstddef>
 #include <utility>
@@ -13,6 +14,20 @@
 namespace ControlStreamServer {
 
 namespace {
+
+using std::chrono::steady_clock;
+
+/// When a wait last ended with a device that took nothing.
+std::atomic<steady_clock::time_point> lastInVain{steady_clock::time_point::min()};
+
+/// Returns how long a device may take nothing. A network that has lost a segment needs some 200 ms.
+std::chrono::milliseconds Patience(steady_clock::time_point now)
+{
+    constexpr std::chrono::milliseconds forTheFirst{500};
+    constexpr std::chrono::milliseconds forTheNext{50};
+    constexpr std::chrono::seconds together{1};
+    return lastInVain.load() + together > now ? forTheNext : forTheFirst;
+}
 
 int BytesNotSent(int descriptor)
 {
@@ -32,13 +47,12 @@ bool ThrowAwayWhatCame(int descriptor)
 
 void AwaitLastBytes(int descriptor, std::chrono::milliseconds limit)
 {
-    using std::chrono::steady_clock;
     // The system tells nobody when it has sent a byte, so it is asked again when some come, or
     // soon.
     constexpr int soon = 2; // milliseconds
-    constexpr std::chrono::milliseconds patience{50};
 
     auto now = steady_clock::now();
+    const std::chrono::milliseconds patience = Patience(now);
     const auto deadline = now + limit;
     auto lastTaken = now;
     int unsent = BytesNotSent(descriptor);
@@ -53,6 +67,9 @@ void AwaitLastBytes(int descriptor, std::chrono::milliseconds limit)
         if (unsent < before) {
             lastTaken = now;
         }
+    }
+    if (unsent > 0) {
+        lastInVain = now;
     }
 }
 

@@ -12,8 +12,9 @@ constexpr std::chrono::milliseconds lastBytesLimit{1000};
 ///
 /// A system that closes a socket with unread bytes resets the connection and forgets what it had
 /// still to send, so that a device which is sending would not hear the last event.
-/// Returns early where the peer has gone, and where it takes nothing for 50 ms: many devices that
-/// do not read would add up to a stop without end. [any]
+/// Returns early where the peer has gone, and where it takes nothing for half a second, or for 50
+/// ms within a second of another wait that ended so: many devices that do not read would add up to
+/// a stop without end, and whoever is closed later had the time of the earlier waits as well. [any]
 void AwaitLastBytes(int descriptor, std::chrono::milliseconds limit);
 
 } // namespace ControlStreamServer
