@@ -11,8 +11,8 @@ enum class EShellInput { Ready, Ended, Interrupted, Terminated, Resized, Resumed
 
 /// The shell's three sources: what is typed, what other threads post, and signals.
 ///
-/// Owns: the blocking of SIGINT, SIGTERM, SIGWINCH and SIGCONT, put back in the end, and the descriptor that
-/// hears them. To be made before any thread. Threads: the main thread.
+/// Owns: the blocking of SIGINT, SIGTERM, SIGWINCH and SIGCONT, put back in the end, and the
+/// descriptor that hears them. To be made before any thread. Threads: the main thread.
 class VShellInput
 {
 public:
