@@ -5,6 +5,7 @@
 
 #include <gtest/gtest.h>
 
+#include <linux/sockios.h>
 #include <sys/ioctl.h>
 
 #include <atomic>
@@ -170,6 +171,23 @@ TEST_F(LastBytes, AreWaitedForOnlyWhileTheDeviceTakesThem)
     AwaitLastBytes(descriptor, std::chrono::hours(1)); // returns
     connection->Close();
     sending.join();
+}
+
+/// A reset overtakes bytes that are on their way, and then they are lost.
+TEST_F(LastBytes, AreWaitedForUntilTheDeviceHasAcknowledgedThem)
+{
+    const int later = 0; // some 40 milliseconds
+    ASSERT_EQ(0,
+              ::setsockopt(client.Descriptor(), IPPROTO_TCP, TCP_QUICKACK, &later, sizeof later));
+    const int descriptor = OtherEndOf(client);
+    connection->Send(L"the last");
+
+    AwaitLastBytes(descriptor, std::chrono::hours(1));
+
+    int owed = -1;
+    EXPECT_EQ(0, ::ioctl(descriptor, SIOCOUTQ, &owed));
+    EXPECT_EQ(0, owed);
+    connection->Close();
 }
 
 /// The wait throws away what comes in, so that nothing behind it can be told from a frame.

@@ -29,10 +29,11 @@ std::chrono::milliseconds Patience(steady_clock::time_point now)
     return lastInVain.load() + together > now ? forTheNext : forTheFirst;
 }
 
-int BytesNotSent(int descriptor)
+/// Returns how many bytes the peer has not acknowledged; an end of the stream counts as one.
+int BytesOwed(int descriptor)
 {
-    int unsent = 0;
-    return ::ioctl(descriptor, SIOCOUTQNSD, &unsent) == 0 ? unsent : 0;
+    int owed = 0;
+    return ::ioctl(descriptor, SIOCOUTQ, &owed) == 0 ? owed : 0;
 }
 
 /// @return false where the peer has ended the stream or the connection is broken
@@ -47,28 +48,28 @@ bool ThrowAwayWhatCame(int descriptor)
 
 void AwaitLastBytes(int descriptor, std::chrono::milliseconds limit)
 {
-    // The system tells nobody when it has sent a byte, so it is asked again when some come, or
-    // soon.
+    // The system tells nobody of an acknowledgement, so it is asked again when bytes come, or soon.
     constexpr int soon = 2; // milliseconds
+    constexpr int onlyTheEnd = 1;
 
     auto now = steady_clock::now();
     const std::chrono::milliseconds patience = Patience(now);
     const auto deadline = now + limit;
     auto lastTaken = now;
-    int unsent = BytesNotSent(descriptor);
-    while (unsent > 0 && now < deadline && now < lastTaken + patience) {
+    int owed = BytesOwed(descriptor);
+    while (owed > onlyTheEnd && now < deadline && now < lastTaken + patience) {
         pollfd poller{descriptor, POLLIN, 0};
         static_cast<void>(::poll(&poller, 1, soon));
         if (!ThrowAwayWhatCame(descriptor)) {
             return;
         }
         now = steady_clock::now();
-        const int before = std::exchange(unsent, BytesNotSent(descriptor));
-        if (unsent < before) {
+        const int before = std::exchange(owed, BytesOwed(descriptor));
+        if (owed < before) {
             lastTaken = now;
         }
     }
-    if (unsent > 0) {
+    if (owed > onlyTheEnd) {
         lastInVain = now;
     }
 }
