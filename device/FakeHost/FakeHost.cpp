@@ -6,6 +6,7 @@
 
 #include <boost/bind/bind.hpp>
 
+#include <chrono>
 #include <stdexcept>
 #include <utility>
 
@@ -20,22 +21,23 @@ using ControlStreamServer::VSocketASIO;
 class VAnnouncingSocket : public ControlStreamServer::ISocket
 {
 public:
-    VAnnouncingSocket(std::shared_ptr<VSocketASIO> listeningSocket, IFakeContent& fakeContent)
-        : socket(std::move(listeningSocket)), content(fakeContent)
+    VAnnouncingSocket(std::shared_ptr<VSocketASIO> listeningSocket,
+                      std::shared_ptr<IFakeContent> fakeContent)
+        : socket(std::move(listeningSocket)), content(std::move(fakeContent))
     {
     }
 
     void SetConnectionHandler(ConnectionHandler handler) override
     {
-        // The content outlives the socket's thread.
-        socket->SetConnectionHandler(boost::bind(&VAnnouncingSocket::Announce, &content,
+        socket->SetConnectionHandler(boost::bind(&VAnnouncingSocket::Announce, content,
                                                  std::move(handler), boost::placeholders::_1));
     }
 
     ~VAnnouncingSocket() noexcept(false) override = default;
 
 private:
-    static void Announce(IFakeContent* told, const ConnectionHandler& handler,
+    static void Announce(const std::shared_ptr<IFakeContent>& told,
+                         const ConnectionHandler& handler,
                          const std::shared_ptr<IClientConnection>& connection)
     {
         told->OnDevice();
@@ -43,30 +45,41 @@ private:
     }
 
     const std::shared_ptr<VSocketASIO> socket;
-    IFakeContent& content;
+    // A message that is being handled holds the server, the server this object, and the commands
+    // need the content.
+    const std::shared_ptr<IFakeContent> content;
 };
+
+// A device that does not read its reply holds up the thread for as long as it likes.
+constexpr std::chrono::milliseconds commandPatience{2000};
 
 } // namespace
 
 VFakeHost::VFakeHost(std::unique_ptr<IFakeContent> fakeContent, std::uint16_t wantedPort)
     : content(std::move(fakeContent))
 {
-    auto listening = std::make_shared<VSocketASIO>(wantedPort);
+    listening = std::make_shared<VSocketASIO>(wantedPort);
     port = listening->Port();
     if (port == 0) {
         throw std::runtime_error("port " + std::to_string(wantedPort) +
                                  " cannot be taken: another program has it, or it needs a "
                                  "privilege");
     }
-    socket = std::make_shared<VAnnouncingSocket>(std::move(listening), *content);
-    server = ControlStreamServer::VServer::Create(content->ControlSystem(), socket, nullptr, false);
+    server = ControlStreamServer::VServer::Create(
+        content->ControlSystem(), std::make_shared<VAnnouncingSocket>(listening, content), nullptr,
+        false);
 }
 
 VFakeHost::~VFakeHost()
 {
+    const bool idle = listening->AwaitThread(commandPatience);
     content->SayFarewell();
     server.reset();
-    socket.reset();
+    // A message that has come since holds the server and with it the port, which the next host may
+    // want at once.
+    if (idle) {
+        static_cast<void>(listening->AwaitThread(commandPatience));
+    }
 }
 
 } // namespace FakeHost

@@ -7,7 +7,7 @@
 
 namespace ControlStreamServer {
 class IServer;
-class ISocket;
+class VSocketASIO;
 } // namespace ControlStreamServer
 
 namespace FakeHost {
@@ -22,7 +22,8 @@ public:
     /// @param port  0 takes any free one
     VFakeHost(std::unique_ptr<IFakeContent> fakeContent, std::uint16_t port);
 
-    /// Closes every connection.
+    /// Closes every connection and lets go of the port. Waits two seconds at most for a command
+    /// that is running.
     ~VFakeHost();
 
     VFakeHost(const VFakeHost&) = delete;
@@ -32,9 +33,9 @@ public:
 
 private:
     // The server goes first and closes the connections; then the socket waits for its thread.
-    const std::unique_ptr<IFakeContent> content;
+    const std::shared_ptr<IFakeContent> content;
     std::uint16_t port = 0;
-    std::shared_ptr<ControlStreamServer::ISocket> socket;
+    std::shared_ptr<ControlStreamServer::VSocketASIO> listening;
     std::shared_ptr<ControlStreamServer::IServer> server;
 };
 

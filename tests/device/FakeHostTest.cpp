@@ -63,6 +63,24 @@ TEST(FakeHost, RefusesAPortThatIsTaken)
                  std::runtime_error);
 }
 
+TEST(FakeHost, LetsGoOfItsPortAlsoWhileADeviceAsks)
+{
+    const VReservedPort port;
+    std::string requests;
+    for (int i = 0; i < 100; ++i) {
+        requests += TestSupport::Frame("<ServerInformation/>");
+    }
+    for (int round = 0; round < 100; ++round) {
+        auto host = std::make_unique<VFakeHost>(FakeHost::MakeSimulatedContent(0, {}),
+                                                port.Number()); // not taken any more
+        VPeer peer(port.Number());
+        peer.Send(requests);
+        peer.ReadFrame();
+
+        host.reset();
+    }
+}
+
 TEST(FakeHost, SaysFarewell)
 {
     auto host = std::make_unique<VFakeHost>(FakeHost::MakeSimulatedContent(1, {}), 0);
