@@ -98,7 +98,9 @@ public:
     ~VPair()
     {
         close(device);
-        close(host);
+        if (!ended) {
+            close(host);
+        }
     }
 
     VPair(const VPair&) = delete;
@@ -106,6 +108,11 @@ public:
 
     void AddTo(std::vector<pollfd>& descriptors, Clock::time_point now) const
     {
+        if (ended) {
+            descriptors.push_back({device, POLLIN, 0});
+            descriptors.push_back({-1, 0, 0});
+            return;
+        }
         descriptors.push_back(
             {device, Wanted(readsDevice && toHost.WantsBytes(), toDevice, now), 0});
         descriptors.push_back({host, Wanted(toDevice.WantsBytes(), toHost, now), 0});
@@ -115,13 +122,19 @@ public:
     {
         // What is due already waits for its socket, not for the time.
         const Clock::time_point never = Clock::time_point::max();
+        if (ended) {
+            return never;
+        }
         return std::min(toDevice.HasDue(now) ? never : toDevice.NextDue(),
                         toHost.HasDue(now) ? never : toHost.NextDue());
     }
 
-    /// @return false where the pair has ended
+    /// @return false where the pair has ended and the device knows
     bool Serve(short deviceEvents, short hostEvents, Clock::time_point now)
     {
+        if (ended) {
+            return DeviceIsThere();
+        }
         if ((deviceEvents & (POLLERR | POLLNVAL)) != 0 ||
             (!readsDevice && (deviceEvents & POLLHUP) != 0)) {
             return false;
@@ -133,7 +146,8 @@ public:
             Read(host, toDevice, &IByteFilter::FromHost, now);
         }
         if (!toHost.Write(host, now) || !toDevice.Write(device, now) || toDevice.IsDone()) {
-            return false;
+            End();
+            return DeviceIsThere();
         }
         if (toHost.IsDone() && !std::exchange(toldHost, true)) {
             shutdown(host, SHUT_WR); // the host may have something to say yet
@@ -142,6 +156,25 @@ public:
     }
 
 private:
+    /// Ends the connection to the host, and of the other one what goes to the device. It is closed
+    /// only after the device has: with something unread it would be reset, and the last bytes on
+    /// their way lost.
+    void End()
+    {
+        ended = true;
+        shutdown(device, SHUT_WR);
+        close(host);
+        filter.reset();
+    }
+
+    /// Throws away what the device sends. @return false where it has ended its side
+    bool DeviceIsThere() const
+    {
+        char bytes[16384];
+        const ssize_t count = recv(device, bytes, sizeof bytes, MSG_DONTWAIT);
+        return count > 0 || (count < 0 && (errno == EAGAIN || errno == EINTR));
+    }
+
     static short Wanted(bool reads, const VProxyChannel& writes, Clock::time_point now)
     {
         return static_cast<short>((reads ? POLLIN : 0) | (writes.HasDue(now) ? POLLOUT : 0));
@@ -162,8 +195,9 @@ private:
 
     const int device;
     const int host;
-    const std::unique_ptr<IByteFilter> filter;
+    std::unique_ptr<IByteFilter> filter; // gone with the connection to the host
     const bool readsDevice;
+    bool ended = false;
     bool toldHost = false;
     VProxyChannel toHost;
     VProxyChannel toDevice;

@@ -219,6 +219,19 @@ TEST(FaultInABatch, ReachesEveryCallWithoutAReply)
     }
 }
 
+/// A reset would take bytes from the device that are still on their way.
+TEST(FaultCut, EndsTheStreamWithoutAReset)
+{
+    const VFaultyHost host(cutAtOnce);
+    VPeer device(host.Port());
+    device.SendFrame("<ServerInformation/>");
+
+    EXPECT_EQ("", device.ReadToEnd());
+
+    EXPECT_TRUE(device.SendFrame("late"));
+    EXPECT_TRUE(device.SendFrame("later"));
+}
+
 TEST(FaultDelay, OnlyDelaysWhereTimeAllows)
 {
     VFaults faults;
