@@ -20,21 +20,19 @@ VShellInbox::~VShellInbox()
 
 void VShellInbox::Post(std::function<void()> function)
 {
-    {
-        const std::lock_guard<std::mutex> lock(mutex);
-        posted.push_back(std::move(function));
-    }
+    const std::lock_guard<std::mutex> lock(mutex);
+    posted.push_back(std::move(function));
     eventfd_write(wake, 1);
 }
 
 void VShellInbox::RunAll()
 {
-    eventfd_t ignored = 0;
-    eventfd_read(wake, &ignored);
     std::vector<std::function<void()>> taken;
     {
         const std::lock_guard<std::mutex> lock(mutex);
         taken.swap(posted);
+        eventfd_t ignored = 0;
+        eventfd_read(wake, &ignored);
     }
     for (const std::function<void()>& function : taken) {
         function();

@@ -25,6 +25,6 @@ public:
 
 private:
     const int wake;
-    std::mutex mutex;
-    std::vector<std::function<void()>> posted; // guarded by mutex
+    std::mutex mutex; // guards the functions, and that the descriptor tells of them
+    std::vector<std::function<void()>> posted;
 };
