@@ -136,6 +136,7 @@ private:
         if (pid == 0) {
             // Between fork and exec only what a signal handler may do.
             prctl(PR_SET_PDEATHSIG, SIGKILL);
+            std::signal(SIGINT, SIG_DFL); // ignored where a shell runs the tests in the background
             dup2(input, STDIN_FILENO);
             dup2(out, STDOUT_FILENO);
             dup2(error, STDERR_FILENO);

@@ -34,6 +34,7 @@ public:
         size.ws_row = 24;
         pid = forkpty(&terminal, nullptr, nullptr, &size);
         if (pid == 0) {
+            std::signal(SIGINT, SIG_DFL);
             setenv("TERM", "xterm", 1);
             close_range(3, ~0U, 0); // the test's own listening sockets among them
             execv(words[0], words.data());

@@ -298,6 +298,7 @@ private:
         if (pid == 0) {
             // Between fork and exec only what a signal handler may do.
             prctl(PR_SET_PDEATHSIG, SIGKILL);
+            std::signal(SIGINT, SIG_DFL); // ignored where a shell runs the tests in the background
             dup2(inputPipe.ends[0], STDIN_FILENO);
             dup2(outputPipe.ends[1], STDOUT_FILENO);
             dup2(errorPipe.ends[1], STDERR_FILENO);

@@ -31,7 +31,13 @@ def run(*words: str) -> Tuple[int, str]:
 
 def start(*words: str) -> "subprocess.Popen[str]":
     return subprocess.Popen(
-        words, cwd=PYTHON, text=True, stdout=subprocess.PIPE, stderr=subprocess.STDOUT
+        words,
+        cwd=PYTHON,
+        text=True,
+        stdout=subprocess.PIPE,
+        stderr=subprocess.STDOUT,
+        # Ignored where a shell runs the tests in the background.
+        preexec_fn=lambda: signal.signal(signal.SIGINT, signal.SIG_DFL),
     )
 
 
