@@ -21,23 +21,22 @@ using ControlStreamServer::VSocketASIO;
 class VAnnouncingSocket : public ControlStreamServer::ISocket
 {
 public:
-    VAnnouncingSocket(std::shared_ptr<VSocketASIO> listeningSocket,
-                      std::shared_ptr<IFakeContent> fakeContent)
-        : socket(std::move(listeningSocket)), content(std::move(fakeContent))
+    VAnnouncingSocket(std::shared_ptr<VSocketASIO> listeningSocket, IFakeContent& fakeContent)
+        : socket(std::move(listeningSocket)), content(fakeContent)
     {
     }
 
     void SetConnectionHandler(ConnectionHandler handler) override
     {
-        socket->SetConnectionHandler(boost::bind(&VAnnouncingSocket::Announce, content,
+        // The content outlives the listening.
+        socket->SetConnectionHandler(boost::bind(&VAnnouncingSocket::Announce, &content,
                                                  std::move(handler), boost::placeholders::_1));
     }
 
     ~VAnnouncingSocket() noexcept(false) override = default;
 
 private:
-    static void Announce(const std::shared_ptr<IFakeContent>& told,
-                         const ConnectionHandler& handler,
+    static void Announce(IFakeContent* told, const ConnectionHandler& handler,
                          const std::shared_ptr<IClientConnection>& connection)
     {
         told->OnDevice();
@@ -45,9 +44,7 @@ private:
     }
 
     const std::shared_ptr<VSocketASIO> socket;
-    // A message that is being handled holds the server, the server this object, and the commands
-    // need the content.
-    const std::shared_ptr<IFakeContent> content;
+    IFakeContent& content;
 };
 
 // A device that does not read its reply holds up the thread for as long as it likes.
@@ -66,7 +63,7 @@ VFakeHost::VFakeHost(std::unique_ptr<IFakeContent> fakeContent, std::uint16_t wa
                                  "privilege");
     }
     server = ControlStreamServer::VServer::Create(
-        content->ControlSystem(), std::make_shared<VAnnouncingSocket>(listening, content), nullptr,
+        content->ControlSystem(), std::make_shared<VAnnouncingSocket>(listening, *content), nullptr,
         false);
 }
 

@@ -32,8 +32,9 @@ public:
     std::uint16_t Port() const { return port; }
 
 private:
-    // The server goes first and closes the connections; then the socket waits for its thread.
-    const std::shared_ptr<IFakeContent> content;
+    // The server goes first and closes the connections; then the socket waits for its thread. The
+    // content goes last, here and nowhere else: it waits for threads of its own.
+    const std::unique_ptr<IFakeContent> content;
     std::uint16_t port = 0;
     std::shared_ptr<ControlStreamServer::VSocketASIO> listening;
     std::shared_ptr<ControlStreamServer::IServer> server;
