@@ -156,11 +156,9 @@ private:
             const auto left = std::chrono::ceil<std::chrono::milliseconds>(
                 nextBeat - std::chrono::steady_clock::now());
             if (left <= std::chrono::milliseconds::zero()) {
-                authorization.Beat();
+                Beat(client, authorization);
                 nextBeat = std::chrono::steady_clock::now() + BeatInterval;
-                continue;
-            }
-            if (const std::optional<VEvent> event = client.WaitForEvent(left)) {
+            } else if (const std::optional<VEvent> event = client.WaitForEvent(left)) {
                 authorization.OnEvent(*event);
             }
             if (authorization.GetState() == EAuthorizationState::Lost) {
@@ -169,6 +167,33 @@ private:
             }
         }
         return EExitCode::Done;
+    }
+
+    /// A host that goes away takes its commands away before it says so.
+    static void Beat(VClient& client, VAuthorization& authorization)
+    {
+        try {
+            authorization.Beat();
+        } catch (const VError&) {
+            if (!HearsOfTheEnd(client, authorization)) {
+                throw;
+            }
+        }
+    }
+
+    static bool HearsOfTheEnd(VClient& client, VAuthorization& authorization)
+    {
+        try {
+            while (const std::optional<VEvent> event = client.WaitForEvent(BeatInterval)) {
+                authorization.OnEvent(*event);
+                if (event->Name == "Event.Disconnect") {
+                    return true;
+                }
+            }
+        } catch (const VError&) {
+            return false; // what failed first tells more
+        }
+        return false;
     }
 
     static void Print(VSession& session, const VAuthorization& authorization)
