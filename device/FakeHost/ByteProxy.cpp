@@ -21,6 +21,9 @@ namespace {
 
 using Clock = VProxyChannel::Clock;
 
+// How long nobody is accepted after no descriptor was free.
+constexpr std::chrono::milliseconds acceptPause{100};
+
 [[noreturn]] void Fail(const char* what)
 {
     throw std::system_error(errno, std::generic_category(), what);
@@ -223,9 +226,10 @@ public:
     {
         std::vector<pollfd> descriptors;
         for (;;) {
-            descriptors = {{stop, POLLIN, 0}, {listener, POLLIN, 0}};
             const Clock::time_point before = Clock::now();
-            Clock::time_point due = Clock::time_point::max();
+            const bool accepts = before >= acceptAgain;
+            descriptors = {{stop, POLLIN, 0}, {accepts ? listener : -1, POLLIN, 0}};
+            Clock::time_point due = accepts ? Clock::time_point::max() : acceptAgain;
             for (const VPair& pair : pairs) {
                 pair.AddTo(descriptors, before);
                 due = std::min(due, pair.NextDue(before));
@@ -267,7 +271,12 @@ private:
     {
         const int device = accept4(listener, nullptr, nullptr, SOCK_CLOEXEC);
         if (device < 0) {
-            return; // gone again, or no descriptor is free: the next turn tries anew
+            // Gone again, or the system has no room. The device then stays where it is, and the
+            // listener readable, so that without a pause each turn would try in vain.
+            if (errno == EMFILE || errno == ENFILE || errno == ENOBUFS || errno == ENOMEM) {
+                acceptAgain = Clock::now() + acceptPause;
+            }
+            return;
         }
         const int connected = ConnectTo(host, stop);
         if (connected < 0) {
@@ -281,6 +290,7 @@ private:
     const int stop;
     const sockaddr_in host;
     unsigned accepted = 0;
+    Clock::time_point acceptAgain = Clock::time_point::min();
     std::list<VPair> pairs;
 };
 

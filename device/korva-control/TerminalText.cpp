@@ -2,7 +2,9 @@
 
 #include "utils/WideText.h"
 
+#include <algorithm>
 #include <cstdio>
+#include <iterator>
 
 namespace {
 
@@ -11,11 +13,31 @@ bool IsControl(wchar_t unit)
     return unit < 0x20 || (unit >= 0x7F && unit <= 0x9F);
 }
 
-/// Line and paragraph separators, and the marks that embed, override or isolate a direction.
+struct VRange
+{
+    wchar_t First;
+    wchar_t Last;
+};
+
+// What is not seen itself but changes how what stands beside it is shown or read. Deliberate: the
+// two joiners, U+200C and U+200D, are not among them, since words and emoji are written with them.
+constexpr VRange invisible[] = {
+    {0x00AD, 0x00AD}, // the soft hyphen
+    {0x061C, 0x061C}, // marks of a direction, here and below
+    {0x180E, 0x180E}, // a separator without width
+    {0x200B, 0x200B}, // a blank without width
+    {0x200E, 0x200F},
+    {0x2028, 0x202E}, // ends of lines and paragraphs; what embeds and overrides a direction
+    {0x2060, 0x206F}, // signs without width; what isolates a direction; controls of old
+    {0xFEFF, 0xFEFF}, // the byte-order mark
+    {0xFFF9, 0xFFFB}, // what hides notes between lines
+};
+
 bool IsInvisible(wchar_t unit)
 {
-    return unit == 0x200E || unit == 0x200F || (unit >= 0x2028 && unit <= 0x202E) ||
-           (unit >= 0x2066 && unit <= 0x2069);
+    return std::any_of(std::begin(invisible), std::end(invisible), [unit](const VRange& range) {
+        return unit >= range.First && unit <= range.Last;
+    });
 }
 
 std::string Escape(wchar_t unit)
