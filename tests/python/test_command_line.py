@@ -5,6 +5,7 @@ import sys
 import unittest
 from typing import Callable, Tuple
 
+from korva_control.terminal import for_terminal
 from scripted_host import LIMIT, Peer, ScriptedHost, parameter
 
 LIST = (
@@ -50,6 +51,12 @@ class CommandLine(unittest.TestCase):
         self.assertEqual((0, "A\nB\\x1B\n", ""), run_on(script, "commands"))
         _, output, _ = run_on(script, "commands", "--json")
         self.assertEqual({"commands": ["A", "B\x1b"]}, json.loads(output))
+
+    def test_what_is_not_seen_is_shown_but_for_joiners(self) -> None:
+        self.assertEqual(
+            "a\\u061C\\u2066\\uFEFF\\xADb\u200c\u200d",
+            for_terminal("a\u061c\u2066\ufeff\xadb\u200c\u200d"),
+        )
 
     def test_run_prints_the_reply(self) -> None:
         def script(peer: Peer) -> None:

@@ -6,13 +6,17 @@ _SHORT = {"\n": "\\n", "\r": "\\r", "\t": "\\t"}
 
 
 def _is_harmful(code: int) -> bool:
-    """Controls, separators of lines, and the marks that turn a direction around."""
+    """Controls, separators of lines, and what is not seen but changes how its neighbours are shown.
+
+    Not the two joiners, U+200C and U+200D: words and emoji are written with them.
+    """
     return (
         code < 0x20
         or 0x7F <= code <= 0x9F
-        or code in (0x200E, 0x200F)
+        or code in (0xAD, 0x061C, 0x180E, 0x200B, 0x200E, 0x200F, 0xFEFF)
         or 0x2028 <= code <= 0x202E
-        or 0x2066 <= code <= 0x2069
+        or 0x2060 <= code <= 0x206F
+        or 0xFFF9 <= code <= 0xFFFB
     )
 
 
