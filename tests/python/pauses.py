@@ -16,7 +16,11 @@ class Pauses:
         self.lengths.put_nowait(seconds)
         await self._ends.get()
 
+    def end(self) -> None:
+        """Ends a pause whose length was taken already."""
+        self._ends.put_nowait(None)
+
     async def end_next(self) -> float:
         length = await asyncio.wait_for(self.lengths.get(), LIMIT)
-        self._ends.put_nowait(None)
+        self.end()
         return length

@@ -148,6 +148,26 @@ class Asking(ClientCase):
         with self.assertRaises(ClosedError):
             await self.authorize()
 
+    async def test_two_calls_at_once_have_one_heart(self) -> None:
+        beats: List[str] = []
+
+        def script(peer: Peer) -> None:
+            for _ in range(2):
+                answer(peer, "Authorized")
+            while len(beats) < 20:
+                request = peer.read()
+                beats.append(between(request, "Value"))
+                peer.reply(request, parameters=parameter("BeatId", beats[-1]))
+            beaten.set()
+            peer.wait_for_end()
+
+        beaten = threading.Event()
+        await self.start(script, options=ClientOptions(heartbeat_seconds=0.01))
+        await asyncio.gather(self.authorize(), self.authorize())
+        await asyncio.get_running_loop().run_in_executor(None, beaten.wait, LIMIT)
+        later = beats[3:]  # the first of the two hearts may beat once
+        self.assertEqual(len(later), len(set(later)))
+
     async def test_a_heartbeat_that_fails_is_told_and_goes_on(self) -> None:
         def script(peer: Peer) -> None:
             answer(peer, "Authorized")

@@ -1,4 +1,5 @@
 import dataclasses
+import sys
 import threading
 import unittest
 from typing import Callable, List
@@ -83,6 +84,30 @@ class BlockingClient(unittest.TestCase):
         self.client.execute("A")
         self.assertTrue(finished.wait(LIMIT))
         self.assertEqual(["7 OK True"], heard)
+
+    def test_a_handler_that_exits_ends_nothing_but_itself(self) -> None:
+        def script(peer: Peer) -> None:
+            for name in ("Event.A", "Event.B"):
+                peer.reply(peer.read())
+                peer.event(name)
+
+        heard = threading.Event()
+        lost = threading.Event()
+
+        def exit_when_lost(state: State, text: str) -> None:
+            lost.set()
+            sys.exit(3)
+
+        self.start(script)
+        self.client.on("Event.A", lambda event: sys.exit(3))
+        self.client.on("Event.B", lambda event: heard.set())
+        self.client.on_state(exit_when_lost)
+        self.client.execute("A")
+        self.client.execute("B")
+        self.assertTrue(heard.wait(LIMIT))
+        self.assertTrue(lost.wait(LIMIT))
+        with self.assertRaises(ClosedError):
+            self.client.execute("C")
 
     def test_a_coroutine_is_no_handler_here(self) -> None:
         async def handle(event: Event) -> None:

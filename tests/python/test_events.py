@@ -91,6 +91,19 @@ class Events(ClientCase):
         self.assertGreater(events.dropped, 90)
         self.assertEqual(f"Event.{events.dropped}", first.name)
 
+    async def test_the_newest_is_kept_whatever_its_size(self) -> None:
+        def script(peer: Peer) -> None:
+            request = peer.read()
+            peer.event("Event.Old")
+            peer.event("Event.Long", parameter("p", "x" * 1000))
+            peer.reply(request)
+
+        await self.start(script, options=ClientOptions(kept_event_bytes=1000))
+        events = self.client.listen()
+        await self.client.execute("A")
+        self.assertEqual("Event.Long", (await events.next(LIMIT)).name)
+        self.assertEqual(1, events.dropped)
+
     async def test_only_one_waits_for_the_next_event_of_a_stream(self) -> None:
         await self.start(Peer.wait_for_end)
         events = self.client.listen()

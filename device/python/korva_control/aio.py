@@ -4,7 +4,6 @@ from __future__ import annotations
 
 import asyncio
 import inspect
-import socket
 from typing import Awaitable, Callable, Dict, List, Optional, Sequence, Tuple, Type, TypeVar, Union
 
 from . import requests
@@ -14,12 +13,10 @@ from .errors import (
     ClosedError,
     ControlError,
     NoConnectionError,
-    ProtocolError,
     TimedOutError,
     UsageError,
 )
-from .exchange import Request
-from .link import Link, reason_of
+from .link import Link
 from .listening import EventStream
 from .messages import Kind, Message
 from .options import ClientOptions, State
@@ -37,6 +34,7 @@ from .requests import Parameters
 EventHandler = Callable[[Event], Union[None, Awaitable[None]]]
 StateHandler = Callable[[State, str], None]
 _Content = TypeVar("_Content")
+_CLOSED_HERE = "this side closed the connection"
 
 
 class AsyncClient:
@@ -59,9 +57,12 @@ class AsyncClient:
         self._state_handlers: List[StateHandler] = []
         self._handled: Optional[EventStream] = None
         self._handler_task: Optional[asyncio.Task[None]] = None
+        self._opening: Optional[asyncio.Task[None]] = None
         self._reconnect_task: Optional[asyncio.Task[None]] = None
         self._last_attempt = ""
-        self._authorizer = Authorizer(self, options.heartbeat_seconds, self._tell)
+        self._authorizer = Authorizer(
+            self, options.heartbeat_seconds, self._tell, self._post
+        )
 
     # The connection.
 
@@ -79,54 +80,29 @@ class AsyncClient:
         self._ended = None
         self._address = (host, port)
         self._closed = NoConnectionError("there is no connection to a host")
-        self._ready = asyncio.Event()
+        ready = self._ready = asyncio.Event()
+        opening = self._opening = asyncio.ensure_future(self._open(ready, self._limit(time_limit)))
         try:
-            await self._open(self._limit(time_limit))
+            await opening
         except BaseException:
+            if self._ready is not ready:  # another task has closed this client meanwhile
+                raise ClosedError(_CLOSED_HERE) from None
             self._ready = None
             raise
 
-    async def _open(self, limit: float) -> None:
-        loop = asyncio.get_running_loop()
-        end = loop.time() + limit
+    async def _open(self, ready: asyncio.Event, limit: float) -> None:
+        host, port = self._address
         link = Link(self._options.frame_limit, self._hear, self._link_lost)
-        where = f"{self._address[0]}:{self._address[1]}"
         try:
-            await asyncio.wait_for(
-                loop.create_connection(lambda: link, *self._address, family=socket.AF_INET), limit
-            )
-        except asyncio.TimeoutError:
-            raise TimedOutError(f"timed out after {limit:g} s, connecting to {where}") from None
-        except OSError as error:
-            raise NoConnectionError(f"no connection to {where}: {reason_of(error)}") from None
-        except UnicodeError as error:  # from the look-up: it is no name that a computer can have
-            raise NoConnectionError(f"no connection to {where}: {error}") from None
-        try:
-            await self._greet(link, limit, max(end - loop.time(), 0.001))
+            await link.connect(host, port, limit)
+            if self._ready is not ready:
+                raise ClosedError(_CLOSED_HERE)
         except BaseException as error:
-            link.close(ClosedError(f"the connection was given up: {error}"))
-            await link.wait_gone()
+            await link.discard(error)
             raise
         self._link = link
-        assert self._ready is not None
-        self._ready.set()
-        self._tell(State.CONNECTED, where)
-
-    async def _greet(self, link: Link, limit: float, left: float) -> None:
-        """Finds out whether a host is there. One that answers has also entered this connection
-        among those that hear events."""
-        what = f"the server information of {self._address[0]}:{self._address[1]}"
-        text = requests.server_information_request()
-        message = await self._exchange_on(
-            link, Kind.SERVER_INFORMATION, "", text, what, left, limit
-        )
-        version = message.content
-        assert isinstance(version, ServerInformation)
-        if version.major != 1:
-            raise ProtocolError(
-                f"the host speaks version {version.major}.{version.minor} of the control stream, "
-                "this client speaks 1.0"
-            )
+        ready.set()
+        self._tell(State.CONNECTED, f"{host}:{port}")
 
     @property
     def connected(self) -> bool:
@@ -134,11 +110,11 @@ class AsyncClient:
 
     async def close(self) -> None:
         """Closes at once and ends whatever waits. What the host has not read yet may be lost."""
-        was_open = self._ready is not None
+        ready = self._ready
         self._ready = None
-        self._closed = ClosedError("this side closed the connection")
+        self._closed = ClosedError(_CLOSED_HERE)
         self._authorizer.forget()
-        for task in (self._reconnect_task, self._handler_task):
+        for task in (self._opening, self._reconnect_task, self._handler_task):
             if task is not None and task is not asyncio.current_task():
                 task.cancel()
         self._reconnect_task = None
@@ -146,7 +122,8 @@ class AsyncClient:
         if link is not None:
             link.close(self._closed)
         self._end_streams(self._closed)
-        if was_open:
+        if ready is not None:
+            ready.set()  # for those who wait for a connection
             self._tell(State.CLOSED, str(self._closed))
         if link is not None:
             await link.wait_gone()
@@ -202,11 +179,12 @@ class AsyncClient:
 
     async def _reconnect(self) -> None:
         back_off = self._options.reconnect
-        assert back_off is not None
+        ready = self._ready
+        assert back_off is not None and ready is not None
         for pause in back_off.seconds():
             await back_off.pause(pause)
             try:
-                await self._open(self._options.time_limit)
+                await self._open(ready, self._options.time_limit)
                 break
             except ControlError as error:
                 self._last_attempt = str(error)
@@ -222,9 +200,12 @@ class AsyncClient:
         return limit
 
     async def _require_link(self, limit: float, what: str) -> Link:
-        if self._link is None and self._ready is not None and self._options.reconnect is not None:
+        loop = asyncio.get_running_loop()
+        end = loop.time() + limit
+        # Once more where a host greets and goes before this task comes to its turn.
+        while self._link is None and self._ready is not None and self._options.reconnect:
             try:
-                await asyncio.wait_for(self._ready.wait(), limit)
+                await asyncio.wait_for(self._ready.wait(), max(end - loop.time(), 0))
             except asyncio.TimeoutError:
                 last = f"; the last attempt: {self._last_attempt}" if self._last_attempt else ""
                 raise TimedOutError(
@@ -250,42 +231,9 @@ class AsyncClient:
         link = await self._require_link(limit, what)
         correlation = link.exchange.next_correlation() if correlated else ""
         left = max(end - loop.time(), 0.001)
-        message = await self._exchange_on(
-            link, kind, correlation, make(correlation), what, left, limit
-        )
+        text = make(correlation).encode()
+        message, _ = await link.ask(kind, correlation, text, what, left, limit)
         return content(message)
-
-    @staticmethod
-    async def _exchange_on(
-        link: Link, kind: Kind, correlation: str, text: str, what: str, left: float, limit: float
-    ) -> Message:
-        """Does one exchange. The time left may be less than the limit, of which the text tells."""
-        loop = asyncio.get_running_loop()
-        done: asyncio.Future[Message] = loop.create_future()
-
-        def complete(message: Optional[Message], error: Optional[ControlError]) -> None:
-            if done.done():
-                return
-            if message is not None:
-                done.set_result(message)
-            elif error is not None:
-                done.set_exception(error)
-
-        request = Request(kind, correlation, text.encode(), what, complete)
-        link.submit(request)
-        timer = loop.call_later(
-            left,
-            lambda: link.give_up(
-                request, TimedOutError(f"timed out after {limit:g} s, waiting for {what}")
-            ),
-        )
-        link.pump()
-        try:
-            return await done
-        finally:
-            timer.cancel()
-            if not request.done:
-                link.give_up(request, ClosedError("the request was given up"))
 
     async def server_information(self, time_limit: Optional[float] = None) -> ServerInformation:
         return await self._exchange(
@@ -355,6 +303,13 @@ class AsyncClient:
             time_limit,
         )
 
+    def _post(self, name: str, parameters: Parameters) -> None:
+        """Runs a command whose reply nobody waits for, if there is a connection."""
+        if self._link is not None:
+            correlation = self._link.exchange.next_correlation()
+            text = requests.execute_command_request(correlation, name, parameters).encode()
+            self._link.post(Kind.COMMAND_REPLY, correlation, text, self._options.time_limit)
+
     async def execute_batch(
         self,
         commands: Sequence[Tuple[str, Parameters]],
@@ -375,28 +330,8 @@ class AsyncClient:
         limit = self._limit(time_limit)
         what = "a reply to the raw frame; a host answers nothing to what it does not understand"
         link = await self._require_link(limit, what)
-        loop = asyncio.get_running_loop()
-        done: asyncio.Future[bytes] = loop.create_future()
-
-        def complete(_message: Optional[Message], error: Optional[ControlError]) -> None:
-            if done.done():
-                return
-            if error is not None:
-                done.set_exception(error)
-            else:
-                done.set_result(link.exchange.raw_frame)
-
-        request = Request(Kind.UNKNOWN, "", text, what, complete)
-        link.submit(request)
-        expired = TimedOutError(f"timed out after {limit:g} s, waiting for {what}")
-        timer = loop.call_later(limit, link.give_up, request, expired)
-        link.pump()
-        try:
-            return await done
-        finally:
-            timer.cancel()
-            if not request.done:
-                link.give_up(request, ClosedError("the request was given up"))
+        _, frame = await link.ask(Kind.UNKNOWN, "", text, what, limit, limit)
+        return frame
 
     # Events.
 
@@ -437,6 +372,8 @@ class AsyncClient:
         if self._handled is None:
             self._handled = EventStream((), self._options.kept_event_bytes)
             self._streams.append(self._handled)
+            self._handler_task = None
+        if self._handler_task is None or self._handler_task.done():  # a handler may have ended it
             task = asyncio.get_running_loop().create_task(self._handle(self._handled))
             self._handler_task = task
 

@@ -4,7 +4,7 @@ from __future__ import annotations
 
 import asyncio
 from dataclasses import dataclass
-from typing import TYPE_CHECKING, Callable, Optional
+from typing import TYPE_CHECKING, Callable, Dict, Optional
 
 from .errors import ControlError, TimedOutError
 from .options import BackOff, State
@@ -29,11 +29,16 @@ class Authorizer:
     """Owns: the wish to be authorized and the task that beats. It belongs to one client."""
 
     def __init__(
-        self, client: AsyncClient, beat_seconds: float, tell: Callable[[State, str], None]
+        self,
+        client: AsyncClient,
+        beat_seconds: float,
+        tell: Callable[[State, str], None],
+        post: Callable[[str, Dict[str, str]], None],
     ) -> None:
         self._client = client
         self._beat_seconds = beat_seconds
         self._tell = tell
+        self._post = post
         self._wish: Optional[_Wish] = None
         self._beating: Optional[asyncio.Task[None]] = None
         self.current: Optional[Authorization] = None
@@ -94,6 +99,9 @@ class Authorizer:
                     event = await outcomes.next(wish.operator_time_limit)
                 except TimedOutError:
                     raise await self._take_back(wish) from None
+                except asyncio.CancelledError:
+                    self._abandon(wish)
+                    raise
                 outcome = Authorization(
                     event.parameters.get("Status", ""),
                     event.parameters.get("ServerName", ""),
@@ -101,6 +109,10 @@ class Authorizer:
                 )
         self._settle(outcome, wish)
         return outcome
+
+    def _abandon(self, wish: _Wish) -> None:
+        """Takes a request back without waiting: whoever has asked has no time left."""
+        self._post("System.Authorize.Cancel", {"DeviceId": wish.device_id})
 
     async def _take_back(self, wish: _Wish) -> TimedOutError:
         """A request that stays open would keep every device out until the operator is back."""
@@ -122,10 +134,14 @@ class Authorizer:
         )
 
     def _settle(self, outcome: Authorization, wish: _Wish) -> None:
+        if not self._client.connected:
+            return  # it was for the connection that has just gone
         self.current = outcome
         if not outcome.granted:
             self._tell(State.NOT_AUTHORIZED, outcome.status)
             return
+        if self._beating is not None:
+            self._beating.cancel()  # two calls of `authorize` at once have one heart
         if wish.heartbeat:
             self._beating = asyncio.get_running_loop().create_task(self._beat())
         self._tell(State.AUTHORIZED, outcome.server_name)

@@ -30,6 +30,7 @@ class Batch:
         self._left = len(commands)
         self._finished: asyncio.Future[None] = self._loop.create_future()
         self._last_reply = 0.0
+        self._timer: asyncio.TimerHandle
         self._requests = [
             self._make_request(index, name, parameters)
             for index, (name, parameters) in enumerate(commands)
@@ -51,12 +52,12 @@ class Batch:
         for request in self._requests:
             self._link.submit(request)
         self._last_reply = self._loop.time()
-        timer = self._loop.call_later(self._time_limit, self._check_time)
+        self._timer = self._loop.call_later(self._time_limit, self._check_time)
         self._link.pump()
         try:
             await self._finished
         finally:
-            timer.cancel()
+            self._timer.cancel()
             self._give_up(ClosedError("the batch was given up"))
         return [reply for reply in self._replies if reply is not None]
 
@@ -65,7 +66,7 @@ class Batch:
         if self._finished.done():
             return
         if silent < self._time_limit:
-            self._loop.call_later(self._time_limit - silent, self._check_time)
+            self._timer = self._loop.call_later(self._time_limit - silent, self._check_time)
             return
         first = self._replies.index(None)
         text = (

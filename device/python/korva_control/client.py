@@ -4,6 +4,7 @@ from __future__ import annotations
 
 import asyncio
 import contextlib
+import functools
 import inspect
 import threading
 from concurrent.futures import CancelledError, ThreadPoolExecutor
@@ -29,6 +30,14 @@ _Result = TypeVar("_Result")
 
 def _closed_here() -> ClosedError:
     return ClosedError("this side closed the connection")
+
+
+def _guarded(handler: Callable[..., None], *arguments: object) -> None:
+    """Calls a handler. One that leaves by sys.exit() would end the client's own thread with it."""
+    try:
+        handler(*arguments)
+    except (SystemExit, KeyboardInterrupt) as error:
+        raise RuntimeError(f"the handler raised {type(error).__name__}") from error
 
 
 class _LoopThread:
@@ -94,7 +103,8 @@ class Listener:
     def next(self, time_limit: Optional[float] = None) -> Event:
         """Returns the next event, waiting for it if none is kept.
 
-        Raises TimedOutError, and ClosedError where none can come any more.
+        Raises TimedOutError after so many seconds, and ClosedError where none can come any more.
+        One thread at a time; a second one meets UsageError.
         """
         return self._thread.call(self._stream.next(time_limit))
 
@@ -214,7 +224,7 @@ class Client:
         thread = self._thread
 
         async def hand_over(event: Event) -> None:
-            await thread.loop.run_in_executor(thread.handlers, handler, event)
+            await thread.loop.run_in_executor(thread.handlers, _guarded, handler, event)
 
         async def add() -> Callable[[], None]:
             return self._client.on(name, hand_over)
@@ -228,7 +238,7 @@ class Client:
 
         It is called on the client's own thread and must not make requests.
         """
-        self._client.on_state(handler)
+        self._client.on_state(functools.partial(_guarded, handler))
 
     @property
     def authorization(self) -> Optional[Authorization]:

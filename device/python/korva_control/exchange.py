@@ -57,7 +57,7 @@ class Exchange:
 
     @property
     def raw_frame(self) -> bytes:
-        """The text of the frame that completes a request of the kind UNKNOWN."""
+        """The text of the frame that completes a request, for as long as it does so."""
         return self._raw_frame
 
     @property

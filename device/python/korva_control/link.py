@@ -4,12 +4,21 @@ from __future__ import annotations
 
 import asyncio
 import os
-from typing import Callable, Optional
+import socket
+from typing import Callable, Optional, Tuple
 
-from .errors import ClosedError, ControlError, ProtocolError
+from .errors import (
+    ClosedError,
+    ControlError,
+    NoConnectionError,
+    ProtocolError,
+    TimedOutError,
+)
 from .exchange import Exchange, Request
 from .framing import FrameBuffer
-from .records import Event
+from .messages import Kind, Message
+from .records import Event, ServerInformation
+from .requests import server_information_request
 
 
 def reason_of(error: Exception) -> str:
@@ -33,6 +42,7 @@ class Link(asyncio.Protocol):
         self._arrived = FrameBuffer(frame_limit)
         self._transport: Optional[asyncio.Transport] = None
         self._may_write = True
+        self._was_made = False
         self._gone = asyncio.Event()
 
     @property
@@ -42,6 +52,7 @@ class Link(asyncio.Protocol):
     def connection_made(self, transport: asyncio.BaseTransport) -> None:
         assert isinstance(transport, asyncio.Transport)
         self._transport = transport
+        self._was_made = True
 
     def data_received(self, data: bytes) -> None:
         self._arrived.add(data)
@@ -72,6 +83,83 @@ class Link(asyncio.Protocol):
         if exception is not None:
             text = f"the connection broke: {reason_of(exception)}"
         self._end(ClosedError(f"{text}; {rest}" if rest else text))
+
+    async def connect(self, host: str, port: int, limit: float) -> None:
+        """Connects within the limit, and finds out whether a host is there. One that answers has
+        also entered this connection among those that hear events."""
+        loop = asyncio.get_running_loop()
+        end = loop.time() + limit
+        where = f"{host}:{port}"
+        try:
+            await asyncio.wait_for(
+                loop.create_connection(lambda: self, host, port, family=socket.AF_INET), limit
+            )
+        except asyncio.TimeoutError:
+            raise TimedOutError(f"timed out after {limit:g} s, connecting to {where}") from None
+        except OSError as error:
+            raise NoConnectionError(f"no connection to {where}: {reason_of(error)}") from None
+        except UnicodeError as error:  # from the look-up: it is no name that a computer can have
+            raise NoConnectionError(f"no connection to {where}: {error}") from None
+        left = max(end - loop.time(), 0.001)
+        await self._greet(f"the server information of {where}", left, limit)
+        if not self.open:  # what came behind the answer has ended it
+            raise self.error
+
+    async def _greet(self, what: str, left: float, limit: float) -> None:
+        text = server_information_request().encode()
+        message, _ = await self.ask(Kind.SERVER_INFORMATION, "", text, what, left, limit)
+        version = message.content
+        assert isinstance(version, ServerInformation)
+        if version.major != 1:
+            raise ProtocolError(
+                f"the host speaks version {version.major}.{version.minor} of the control stream, "
+                "this client speaks 1.0"
+            )
+
+    async def discard(self, error: BaseException) -> None:
+        """Gives back the socket of a connection that did not come about."""
+        if self.open:
+            self.close(ClosedError(f"the connection was given up: {error}"))
+        if self._was_made:
+            await self._gone.wait()
+
+    async def ask(
+        self, kind: Kind, correlation: str, text: bytes, what: str, left: float, limit: float
+    ) -> Tuple[Message, bytes]:
+        """Does one exchange. The time left may be less than the limit, of which the error tells.
+
+        @return the reply and the text of its frame
+        """
+        loop = asyncio.get_running_loop()
+        done: asyncio.Future[Tuple[Message, bytes]] = loop.create_future()
+
+        def complete(message: Optional[Message], error: Optional[ControlError]) -> None:
+            if done.done():
+                return
+            if message is not None:
+                done.set_result((message, self.exchange.raw_frame))
+            elif error is not None:
+                done.set_exception(error)
+
+        request = Request(kind, correlation, text, what, complete)
+        self.submit(request)
+        expired = TimedOutError(f"timed out after {limit:g} s, waiting for {what}")
+        timer = loop.call_later(left, self.give_up, request, expired)
+        self.pump()
+        try:
+            return await done
+        finally:
+            timer.cancel()
+            if not request.done:
+                self.give_up(request, ClosedError("the request was given up"))
+
+    def post(self, kind: Kind, correlation: str, text: bytes, limit: float) -> None:
+        """Sends a request whose reply nobody waits for. It counts as unanswered up to the limit."""
+        request = Request(kind, correlation, text, "nothing", lambda message, error: None)
+        self.submit(request)
+        expired = TimedOutError("nobody waits for the reply")
+        asyncio.get_running_loop().call_later(limit, self.give_up, request, expired)
+        self.pump()
 
     def pump(self) -> None:
         """Sends what may be sent."""

@@ -42,7 +42,7 @@ class EventStream:
             return
         self._kept.append((event, size))
         self._bytes += size
-        while self._bytes > self._kept_bytes:
+        while self._bytes > self._kept_bytes and len(self._kept) > 1:
             self._take()
             self.dropped += 1
         self._wake()
@@ -61,7 +61,8 @@ class EventStream:
     async def next(self, time_limit: Optional[float] = None) -> Event:
         """Returns the next event, waiting for it if none is kept.
 
-        Raises TimedOutError, and ClosedError where none can come any more. One caller at a time.
+        Raises TimedOutError after so many seconds, and ClosedError where none can come any more.
+        One caller at a time; a second one meets UsageError.
         """
         while not self._kept:
             if self._end is not None:

@@ -54,7 +54,7 @@ class ClientOptions:
 
     kept_event_bytes: int = 16 << 20
     """How many bytes of events each listener keeps for a caller who does not take them. Beyond that
-    the oldest are dropped, and counted."""
+    the oldest are dropped, and counted; the newest is kept whatever its size."""
 
 
 class State(enum.Enum):
