@@ -1,6 +1,7 @@
 #include "korva-control/Arguments.h"
 
 #include <algorithm>
+#include <charconv>
 
 #include <CLI/CLI.hpp>
 
@@ -46,10 +47,20 @@ std::string PlainMessage(std::string message)
     return message;
 }
 
-std::string CheckWhole(const std::string& text)
+CLI::Validator WholeNumber(std::uint64_t least, std::uint64_t greatest)
 {
-    const bool good = !text.empty() && text.find_first_not_of("0123456789") == std::string::npos;
-    return good ? std::string() : "\"" + text + "\" is no whole number from 0 on";
+    const auto check = [least, greatest](std::string& text) {
+        std::uint64_t number = 0;
+        const char* const end = text.data() + text.size();
+        const auto read = std::from_chars(text.data(), end, number);
+        if (read.ec != std::errc() || read.ptr != end || number < least || number > greatest) {
+            return "\"" + text + "\" is no whole number from " + std::to_string(least) + " to " +
+                   std::to_string(greatest);
+        }
+        text = std::to_string(number);
+        return std::string();
+    };
+    return CLI::Validator(check, std::string());
 }
 
 std::function<std::string(const std::string&)> CheckNumber(int greatest)

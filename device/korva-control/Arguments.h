@@ -1,8 +1,13 @@
 #pragma once
 
+#include <cstdint>
 #include <functional>
 #include <string>
 #include <vector>
+
+namespace CLI {
+class Validator;
+}
 
 // The parser of the command line reads some words as a notation of its own: "++" ends a command,
 // "[a,b]" is a list of two, and behind "--" a word is only plain where the command wants more. Here
@@ -18,9 +23,10 @@ std::string PlainWord(std::string word);
 /// Takes all marks from a message of the parser.
 std::string PlainMessage(std::string message);
 
-/// Says what is wrong with a text that should be a whole number without a sign; empty where it is
-/// one. The parser would take a negative number for a very great one.
-std::string CheckWhole(const std::string& text);
+/// Returns a check that admits whole numbers in decimal, from `least` to `greatest`; to be given to
+/// an option as a transformation. The parser by itself would take a negative number for a very
+/// great one, one that is too great for the greatest there is, and "010" for eight.
+CLI::Validator WholeNumber(std::uint64_t least, std::uint64_t greatest);
 
 /// Returns a check that says what is wrong with a text that should be a number from 0 on. The
 /// parser's own lets pass what is not a number, since that is neither below nor above anything.

@@ -63,6 +63,11 @@ std::string SentenceOf(EAuthorizationState state, const std::string& server)
     return "the request is taken back";
 }
 
+std::chrono::milliseconds Until(std::chrono::steady_clock::time_point moment)
+{
+    return std::chrono::ceil<std::chrono::milliseconds>(moment - std::chrono::steady_clock::now());
+}
+
 class VCommandAuthorize : public ICommand
 {
 public:
@@ -153,8 +158,7 @@ private:
         const VStopSignals stop(client);
         auto nextBeat = std::chrono::steady_clock::now();
         while (!stop.IsRequested()) {
-            const auto left = std::chrono::ceil<std::chrono::milliseconds>(
-                nextBeat - std::chrono::steady_clock::now());
+            const std::chrono::milliseconds left = Until(nextBeat);
             if (left <= std::chrono::milliseconds::zero()) {
                 Beat(client, authorization);
                 nextBeat = std::chrono::steady_clock::now() + BeatInterval;
@@ -184,7 +188,13 @@ private:
     static bool HearsOfTheEnd(VClient& client, VAuthorization& authorization)
     {
         try {
-            while (const std::optional<VEvent> event = client.WaitForEvent(BeatInterval)) {
+            // Other events must not put off the failure for ever.
+            const auto end = std::chrono::steady_clock::now() + BeatInterval;
+            for (auto left = BeatInterval; left.count() > 0; left = Until(end)) {
+                const std::optional<VEvent> event = client.WaitForEvent(left);
+                if (!event) {
+                    return false;
+                }
                 authorization.OnEvent(*event);
                 if (event->Name == "Event.Disconnect") {
                     return true;

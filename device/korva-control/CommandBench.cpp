@@ -60,10 +60,10 @@ public:
         command->add_option("PARAMETER", assignments, "NAME=VALUE, as many as there are")
             ->transform(&PlainWord);
         command->add_option("--requests", requests, "How many requests each connection makes")
-            ->check(CLI::Range(1, 100000000))
+            ->transform(WholeNumber(1, 100000000))
             ->capture_default_str();
         command->add_option("--connections", connections, "How many connections there are")
-            ->check(CLI::Range(1, 1000))
+            ->transform(WholeNumber(1, 1000))
             ->capture_default_str();
         return command;
     }

@@ -31,8 +31,8 @@ public:
             }
         }
         if (hosts.empty()) {
-            PrintNotice("no host advertises itself; doctor tells more");
-            return EExitCode::NoConnection;
+            throw ControlStream::VError(ControlStream::EErrorKind::NoConnection,
+                                        "no host advertises itself; doctor tells more");
         }
         return EExitCode::Done;
     }

@@ -36,7 +36,7 @@ public:
     {
         const std::string text{std::istreambuf_iterator<char>(std::cin), {}};
         if (lint) {
-            Lint(text);
+            Lint(session.Output(), text);
         }
         VClient& client = session.Connect();
         if (noReply) {
@@ -54,14 +54,14 @@ public:
     }
 
 private:
-    static void Lint(const std::string& text)
+    static void Lint(const VOutput& output, const std::string& text)
     {
         const ControlStream::VLintReport report = ControlStream::LintRequest(text);
         if (!report.Refusal.empty()) {
             throw VError(EErrorKind::Usage, "a host would drop this in silence: " + report.Refusal);
         }
         for (const std::string& warning : report.Warnings) {
-            PrintNotice("warning: " + warning);
+            output.PrintWarning(warning);
         }
     }
 

@@ -35,7 +35,7 @@ public:
             ->transform(&PlainWord);
         command->add_flag("--overwrite", overwrite, "The file may be there");
         command->add_option("--listen", listen, "The port for the devices; 0 takes any free one")
-            ->check(CLI::Range(0, 65535))
+            ->transform(WholeNumber(0, 65535))
             ->type_name("PORT");
         return command;
     }
@@ -64,11 +64,11 @@ private:
         proxy.Start([&recorder](unsigned connection) { return recorder->MakeFilter(connection); });
         std::unique_ptr<VAsyncClient> listener;
         if (listen) {
-            PrintNotice("recording what devices and " + session.Peer() + " say, on port " +
-                        std::to_string(proxy.Port()));
+            session.Output().PrintNotice("recording what devices and " + session.Peer() +
+                                         " say, on port " + std::to_string(proxy.Port()));
         } else {
             listener = Listen(proxy.Port());
-            PrintNotice("recording what " + session.Peer() + " says");
+            session.Output().PrintNotice("recording what " + session.Peer() + " says");
         }
         signals.Await(session.IsTimeLimitGiven() ? std::optional(session.TimeLimit())
                                                  : std::nullopt);

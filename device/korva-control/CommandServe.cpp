@@ -10,6 +10,7 @@
 
 #include <cmath>
 #include <fstream>
+#include <limits>
 #include <map>
 
 #include <CLI/CLI.hpp>
@@ -27,6 +28,31 @@ const std::map<std::string, EDecision> Decisions{
 };
 
 constexpr int SecondsOfADay = 86400;
+constexpr std::uint64_t MostBytes = std::numeric_limits<std::uint64_t>::max();
+
+/// A host, behind a proxy where there are faults.
+class VServing
+{
+public:
+    VServing(std::unique_ptr<FakeHost::IFakeContent> content, std::uint16_t port,
+             const FakeHost::VFaults& faults)
+        : host(std::make_unique<FakeHost::VFakeHost>(std::move(content),
+                                                     faults.Any() ? std::uint16_t(0) : port))
+    {
+        if (faults.Any()) {
+            proxy = std::make_unique<FakeHost::VByteProxy>(
+                port, FakeHost::LoopbackAddress(host->Port()), [faults](unsigned connection) {
+                    return FakeHost::MakeFaultFilter(faults, connection);
+                });
+        }
+    }
+
+    std::uint16_t Port() const { return proxy ? proxy->Port() : host->Port(); }
+
+private:
+    std::unique_ptr<FakeHost::VFakeHost> host;
+    std::unique_ptr<FakeHost::VByteProxy> proxy; // goes first
+};
 
 class VCommandServe : public ICommand
 {
@@ -40,7 +66,7 @@ public:
             "for --timeout seconds. Faults are those of a byte proxy before it; several may be "
             "chosen. Whether others than this machine can connect is a matter of its firewall.");
         command->add_option("--listen", listen, "The port to listen on; 0 takes any free one")
-            ->check(CLI::Range(0, 65535))
+            ->transform(WholeNumber(0, 65535))
             ->type_name("PORT");
         AddContent(*command);
         AddFaults(*command);
@@ -52,22 +78,10 @@ public:
         const VAwaitedSignals signals;
         std::unique_ptr<FakeHost::IFakeContent> content = MakeContent();
         const auto port = static_cast<std::uint16_t>(listen.value_or(session.Options().Port));
-        const FakeHost::VFaults faults = MakeFaults();
-        try {
-            FakeHost::VFakeHost host(std::move(content), faults.Any() ? std::uint16_t(0) : port);
-            std::optional<FakeHost::VByteProxy> proxy;
-            if (faults.Any()) {
-                proxy.emplace(port, FakeHost::LoopbackAddress(host.Port()),
-                              [faults](unsigned connection) {
-                                  return FakeHost::MakeFaultFilter(faults, connection);
-                              });
-            }
-            PrintPort(session.Output(), proxy ? proxy->Port() : host.Port());
-            signals.Await(session.IsTimeLimitGiven() ? std::optional(session.TimeLimit())
-                                                     : std::nullopt);
-        } catch (const std::runtime_error& error) {
-            throw VError(EErrorKind::NoConnection, error.what());
-        }
+        const VServing serving = Listen(std::move(content), port);
+        PrintPort(session.Output(), serving.Port());
+        signals.Await(session.IsTimeLimitGiven() ? std::optional(session.TimeLimit())
+                                                 : std::nullopt);
         return EExitCode::Done;
     }
 
@@ -76,7 +90,7 @@ private:
     {
         auto* const simulated =
             command.add_option("--cameras", cameras, "How many simulated cameras there are")
-                ->check(CLI::Range(0, 1000))
+                ->transform(WholeNumber(0, 1000))
                 ->capture_default_str();
         auto* const decides =
             command
@@ -106,13 +120,13 @@ private:
         command
             .add_option("--cut-after", cutAfter,
                         "The connection is closed behind so many bytes of the host's")
-            ->check(&CheckWhole)
+            ->transform(WholeNumber(0, MostBytes))
             ->type_name("BYTES")
             ->group(group);
         command
             .add_option("--garbage-after", garbageAfter,
                         "What follows so many bytes of the host's is noise")
-            ->check(&CheckWhole)
+            ->transform(WholeNumber(0, MostBytes))
             ->type_name("BYTES")
             ->group(group);
         command.add_flag("--never-reply", neverReply, "Nothing of the host's arrives")
@@ -123,7 +137,7 @@ private:
             .add_option("--faulty", faulty,
                         "Only so many connections are faulty, the first ones; all where it is not "
                         "given")
-            ->check(CLI::Range(1, 1000000))
+            ->transform(WholeNumber(1, 1000000))
             ->type_name("COUNT")
             ->group(group);
     }
@@ -140,6 +154,15 @@ private:
             throw VError(EErrorKind::Usage, recording + " cannot be read");
         }
         return FakeHost::MakeRecordedContent(FakeHost::ReadRecording(file, recording));
+    }
+
+    VServing Listen(std::unique_ptr<FakeHost::IFakeContent> content, std::uint16_t port) const
+    {
+        try {
+            return VServing(std::move(content), port, MakeFaults());
+        } catch (const std::runtime_error& error) {
+            throw VError(EErrorKind::NoConnection, error.what());
+        }
     }
 
     FakeHost::VFaults MakeFaults() const

@@ -5,6 +5,7 @@
 #include "korva-control/StopSignals.h"
 
 #include <algorithm>
+#include <limits>
 
 #include <CLI/CLI.hpp>
 
@@ -15,13 +16,7 @@ using ControlStream::VClient;
 using ControlStream::VError;
 using ControlStream::VEvent;
 
-/// The parser would take a negative number for a very great one.
-std::string CheckCount(const std::string& text)
-{
-    const bool good = text.find_first_not_of("0123456789") == std::string::npos &&
-                      text.find_first_not_of('0') != std::string::npos;
-    return good ? std::string() : "a count is a whole number above 0";
-}
+constexpr std::uint64_t Endless = std::numeric_limits<std::uint64_t>::max();
 
 class VCommandWatch : public ICommand
 {
@@ -36,11 +31,12 @@ public:
             ->transform(&PlainWord);
         command
             ->add_option("--camera", cameras, "Only events about these cameras, by their numbers")
-            ->check(&CheckWhole)
+            ->transform(WholeNumber(0, std::numeric_limits<std::uint32_t>::max()))
             ->type_name("NUMBER")
             ->allow_extra_args(false); // behind it stand the names of events
         command->add_flag("--time", stamps, "Print the time of each event, in universal time");
-        command->add_option("--count", count, "End after so many events")->check(&CheckCount);
+        command->add_option("--count", count, "End after so many events")
+            ->transform(WholeNumber(1, Endless));
         return command;
     }
 
@@ -51,7 +47,7 @@ public:
         // none is missed from the notice on.
         client.GetServerInformation();
         const VStopSignals stop(client); // until here a signal ends the program, as any other
-        PrintNotice("watching " + session.Peer());
+        session.Output().PrintNotice("watching " + session.Peer());
 
         const auto start = std::chrono::steady_clock::now();
         std::uint64_t seen = 0;
@@ -109,7 +105,7 @@ private:
     std::vector<std::string> names;
     std::vector<std::uint32_t> cameras;
     bool stamps = false;
-    std::uint64_t count = std::numeric_limits<std::uint64_t>::max();
+    std::uint64_t count = Endless;
 };
 
 } // namespace

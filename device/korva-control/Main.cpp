@@ -1,13 +1,13 @@
 #include "korva-control/Arguments.h"
 #include "korva-control/Commands.h"
 #include "korva-control/Session.h"
-#include "korva-control/TerminalText.h"
 
 #include "QuorixVersion.h"
 #include "utils/StandardStreams.h"
 
 #include <algorithm>
 #include <exception>
+#include <iostream>
 
 #include <CLI/CLI.hpp>
 #include <unistd.h>
@@ -58,7 +58,7 @@ void AddOptions(CLI::App& program, VSessionOptions& options)
         ->transform(&PlainWord)
         ->capture_default_str();
     program.add_option("--port", options.Port, "The port on which the host listens")
-        ->check(CLI::Range(1, 65535))
+        ->transform(WholeNumber(1, 65535))
         ->capture_default_str();
     program.add_flag("--json", options.Json, "Print each result as one JSON object on a line");
     program
@@ -68,23 +68,37 @@ void AddOptions(CLI::App& program, VSessionOptions& options)
         ->check(&CheckSeconds);
 }
 
+EExitCode Fail(const VOutput& output, const std::string& text, EExitCode exitCode)
+{
+    output.PrintFailure(text, exitCode);
+    return exitCode;
+}
+
 EExitCode RunGuarded(ICommand& command, const VSessionOptions& options)
 {
+    const VOutput output(options.Json);
     try {
         VSession session(options);
         return command.Run(session);
     } catch (const VError& error) {
-        PrintNotice(error.what());
-        return ExitCodeOf(error.Kind());
+        return Fail(output, error.what(), ExitCodeOf(error.Kind()));
     } catch (const std::exception& error) {
-        PrintNotice(error.what());
-        return EExitCode::HostFailed;
+        return Fail(output, error.what(), EExitCode::HostFailed);
     }
 }
 
-std::string FailureText(const CLI::App* /*program*/, const CLI::Error& error)
+/// Help and version come as an error too, one with the code 0.
+EExitCode EndEarly(const CLI::App& program, const CLI::ParseError& error, bool json)
 {
-    return "korva-control: " + ForTerminal(PlainMessage(error.what())) + "; --help tells more\n";
+    const VOutput output(json);
+    if (error.get_exit_code() != 0) {
+        return Fail(output, PlainMessage(error.what()) + "; --help tells more",
+                    EExitCode::WrongUsage);
+    }
+    program.exit(error);
+    return std::cout.flush()
+               ? EExitCode::Done
+               : Fail(output, "standard output cannot be written", EExitCode::HostFailed);
 }
 
 EExitCode Run(int argc, char** argv)
@@ -92,8 +106,7 @@ EExitCode Run(int argc, char** argv)
     CLI::App program("Drives a motion-capture host over its control stream", "korva-control");
     program.footer(ExitCodeHelp);
     program.require_subcommand(0, 1); // none is refused below, in words of our own
-    program.failure_message(&FailureText);
-    program.fallthrough(); // the options may stand behind the command as well
+    program.fallthrough();            // the options may stand behind the command as well
 
     VSessionOptions options;
     AddOptions(program, options);
@@ -103,12 +116,14 @@ EExitCode Run(int argc, char** argv)
     for (const std::unique_ptr<ICommand>& command : commands) {
         chosen.push_back(command->AddTo(program));
     }
+    std::vector<std::string> words = ProtectArguments(argc, argv);
+    // Wherever it stands, since the parser may not have come to it.
+    const bool json = std::find(words.begin(), words.end(), "--json") != words.end();
     try {
-        std::vector<std::string> words = ProtectArguments(argc, argv);
         std::reverse(words.begin(), words.end()); // the parser takes them from the back
         program.parse(words);
     } catch (const CLI::ParseError& error) {
-        return program.exit(error) == 0 ? EExitCode::Done : EExitCode::WrongUsage;
+        return EndEarly(program, error, json);
     }
     options.IsHostGiven = program.count("--host") > 0;
     for (std::size_t i = 0; i < commands.size(); ++i) {
@@ -116,8 +131,8 @@ EExitCode Run(int argc, char** argv)
             return RunGuarded(*commands[i], options);
         }
     }
-    PrintNotice("a command is needed; --help lists them");
-    return EExitCode::WrongUsage;
+    return Fail(VOutput(options.Json), "a command is needed; --help lists them",
+                EExitCode::WrongUsage);
 }
 
 } // namespace

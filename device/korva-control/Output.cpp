@@ -17,6 +17,21 @@ void Write(const std::string& line)
     }
 }
 
+std::string JsonText(const VJson& object)
+{
+    return object.dump(-1, ' ', false, VJson::error_handler_t::replace);
+}
+
+void WriteError(const std::string& line)
+{
+    std::fputs((line + "\n").c_str(), stderr);
+}
+
+std::string OwnLine(const std::string& text)
+{
+    return "korva-control: " + ForTerminal(text);
+}
+
 } // namespace
 
 void VOutput::PrintLine(const std::string& line)
@@ -26,12 +41,35 @@ void VOutput::PrintLine(const std::string& line)
 
 void VOutput::PrintJson(const VJson& object)
 {
-    Write(object.dump(-1, ' ', false, VJson::error_handler_t::replace));
+    Write(JsonText(object));
 }
 
 void VOutput::PrintRaw(const std::string& bytes)
 {
     Write(isatty(STDOUT_FILENO) != 0 ? LinesForTerminal(bytes) : bytes);
+}
+
+void VOutput::PrintNotice(const std::string& text) const
+{
+    WriteError(json ? JsonText({{"notice", text}}) : OwnLine(text));
+}
+
+void VOutput::PrintWarning(const std::string& text) const
+{
+    WriteError(json ? JsonText({{"warning", text}}) : OwnLine("warning: " + text));
+}
+
+void VOutput::PrintFailure(const std::string& text, std::optional<EExitCode> exitCode) const
+{
+    if (!json) {
+        WriteError(OwnLine(text));
+        return;
+    }
+    VJson object = {{"error", text}};
+    if (exitCode) {
+        object["exitCode"] = static_cast<int>(*exitCode);
+    }
+    WriteError(JsonText(object));
 }
 
 VJson ToJson(const ControlStream::VParameters& parameters)

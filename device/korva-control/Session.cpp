@@ -1,10 +1,8 @@
 #include "korva-control/Session.h"
 
 #include "ControlStreamClient/Discovery.h"
-#include "korva-control/TerminalText.h"
 
 #include <cmath>
-#include <cstdio>
 
 namespace {
 
@@ -43,10 +41,4 @@ std::chrono::milliseconds VSession::TimeLimit() const
 std::string VSession::Peer() const
 {
     return options.Host + ":" + std::to_string(options.Port);
-}
-
-void PrintNotice(const std::string& text)
-{
-    const std::string line = "korva-control: " + ForTerminal(text) + "\n";
-    std::fputs(line.c_str(), stderr);
 }

@@ -53,6 +53,3 @@ private:
     VOutput output;
     ControlStream::VClient client;
 };
-
-/// Writes a line about the program's own doings to standard error.
-void PrintNotice(const std::string& text);

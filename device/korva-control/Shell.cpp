@@ -296,8 +296,10 @@ std::vector<VParameterInformation> VShell::ParametersOf(const std::string& comma
 void VShell::Print(EColour colour, const std::string& line)
 {
     if (output.IsJson()) {
-        if (colour == EColour::Notice || colour == EColour::Failure) {
-            PrintNotice(line);
+        if (colour == EColour::Notice) {
+            output.PrintNotice(line);
+        } else if (colour == EColour::Failure) {
+            output.PrintFailure(line, std::nullopt);
         } else {
             output.PrintLine(line);
         }

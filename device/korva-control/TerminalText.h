@@ -4,7 +4,8 @@
 
 /// Makes a text from elsewhere harmless on a terminal: control characters, and invisible ones such
 /// as those that turn the direction of a line, become "\n", "\t", "\x1B" or "\u202E"; what is not
-/// UTF-8 becomes U+FFFD. A backslash stays as it is, so that the form is for reading, not for decoding.
+/// UTF-8 becomes U+FFFD. A backslash stays as it is, so that the form is for reading, not for
+/// decoding.
 std::string ForTerminal(const std::string& text);
 
 /// The same, but line ends and tabs stay, for a text of several lines.

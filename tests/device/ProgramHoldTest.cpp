@@ -74,3 +74,16 @@ TEST(ProgramHold, TellsWhatFailedWhereTheHostSaysNoMore)
     EXPECT_THAT(outcome.Errors, HasSubstr("System.Heartbeat as it should: Error: no"));
     EXPECT_EQ(1, outcome.ExitCode);
 }
+
+TEST(ProgramHold, TellsWhatFailedThoughEventsNeverEnd)
+{
+    VScriptedHost host([](VPeer& peer) {
+        Serve(peer, [&](const std::string& correlation) {
+            peer.SendFrame(ReplyText(correlation, "Error: no"));
+            while (peer.SendFrame(EventText("Event.Other"))) {
+            }
+        });
+    });
+
+    EXPECT_EQ(1, RunProgram(At(host, hold)).ExitCode);
+}

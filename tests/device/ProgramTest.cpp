@@ -170,12 +170,12 @@ TEST_P(ProgramUsage, IsRefusedWithTwoBeforeAnyConnection)
 // clang-format off
 const VUsageCase usageCases[] = {
     {"NoCommand", {}, "a command is needed; --help lists them"},
-    {"OptionsAlone", {"--json"}, "a command is needed; --help lists them"},
+    {"OptionsAlone", {"--timeout", "1"}, "a command is needed; --help lists them"},
     {"UnknownCommand", {"fly"}, "The following argument was not expected: fly; --help tells more"},
     {"ControlCharacterInAnArgument", {"\x1B[2J"}, "The following argument was not expected: \\x1B[2J; --help tells more"},
     {"UnknownOption", {"info", "--fast"}, "The following argument was not expected: --fast; --help tells more"},
-    {"PortZero", {"--port", "0", "info"}, "--port: Value 0 not in range 1 to 65535; --help tells more"},
-    {"PortTooGreat", {"--port", "65536", "info"}, "--port: Value 65536 not in range 1 to 65535; --help tells more"},
+    {"PortZero", {"--port", "0", "info"}, "--port: \"0\" is no whole number from 1 to 65535; --help tells more"},
+    {"PortTooGreat", {"--port", "65536", "info"}, "--port: \"65536\" is no whole number from 1 to 65535; --help tells more"},
     {"NoTime", {"--timeout", "0", "info"}, "--timeout: a time limit is a number of seconds above 0; --help tells more"},
     {"NegativeTime", {"--timeout", "-1", "info"}, "--timeout: a time limit is a number of seconds above 0; --help tells more"},
     {"TimeThatIsNoNumber", {"--timeout", "nan", "info"}, "--timeout: a time limit is a number of seconds above 0; --help tells more"},
@@ -194,14 +194,84 @@ const VUsageCase usageCases[] = {
     {"RunWithEmptyParameterName", {"run", "Go", "=1"}, "the name of a parameter is empty, and the host answers nothing to that"},
     {"RunWithBlankValue", {"run", "Go", "a= "}, "the value of the parameter \"a\" is white space alone, which would reach the host as an empty one"},
     {"RunWithInvalidValue", {"run", "Go", "a=\xFF"}, "the value of the parameter \"a\" is not valid UTF-8"},
-    {"CountOfNothing", {"watch", "--count", "0"}, "--count: a count is a whole number above 0; --help tells more"},
-    {"NegativeCount", {"watch", "--count", "-1"}, "--count: a count is a whole number above 0; --help tells more"},
-    {"CountInWords", {"watch", "--count", "two"}, "--count: a count is a whole number above 0; --help tells more"},
+    {"CountOfNothing", {"watch", "--count", "0"}, "--count: \"0\" is no whole number from 1 to 18446744073709551615; --help tells more"},
+    {"NegativeCount", {"watch", "--count", "-1"}, "--count: \"-1\" is no whole number from 1 to 18446744073709551615; --help tells more"},
+    {"CountInWords", {"watch", "--count", "two"}, "--count: \"two\" is no whole number from 1 to 18446744073709551615; --help tells more"},
+    {"CountBeyondTheGreatest", {"watch", "--count", "18446744073709551616"}, "--count: \"18446744073709551616\" is no whole number from 1 to 18446744073709551615; --help tells more"},
+    {"CameraBeyondTheGreatest", {"watch", "--camera", "4294967296"}, "--camera: \"4294967296\" is no whole number from 0 to 4294967295; --help tells more"},
+    {"HexadecimalPort", {"--port", "0x10", "info"}, "--port: \"0x10\" is no whole number from 1 to 65535; --help tells more"},
+    {"BytesBeyondTheGreatest", {"serve", "--cut-after", "18446744073709551616"}, "--cut-after: \"18446744073709551616\" is no whole number from 0 to 18446744073709551615; --help tells more"},
 };
 // clang-format on
 
 INSTANTIATE_TEST_SUITE_P(Table, ProgramUsage, testing::ValuesIn(usageCases),
                          [](const auto& test) { return test.param.Name; });
+
+struct VJsonFailureCase
+{
+    const char* Name;
+    std::vector<std::string> Arguments;
+    const char* Errors; // as JSON
+    int ExitCode;
+};
+
+class ProgramJson : public testing::TestWithParam<VJsonFailureCase>
+{
+};
+
+TEST_P(ProgramJson, TellsAFailureAsOneObjectOnStandardError)
+{
+    const VOutcome outcome = RunProgram(GetParam().Arguments);
+
+    EXPECT_EQ(GetParam().Errors + "\n"s, outcome.Errors);
+    EXPECT_EQ(GetParam().ExitCode, outcome.ExitCode);
+    EXPECT_EQ("", outcome.Output);
+}
+
+// clang-format off
+const VJsonFailureCase jsonFailureCases[] = {
+    {"NoCommand", {"--json"}, R"({"error":"a command is needed; --help lists them","exitCode":2})", 2},
+    {"BeforeWhatIsWrong", {"--json", "fly"}, R"({"error":"The following argument was not expected: fly; --help tells more","exitCode":2})", 2},
+    {"BehindWhatIsWrong", {"--port", "0", "info", "--json"}, R"({"error":"--port: \"0\" is no whole number from 1 to 65535; --help tells more","exitCode":2})", 2},
+    {"ControlCharacter", {"--json", "\x1B\xFF"}, "{\"error\":\"The following argument was not expected: \\u001b\xEF\xBF\xBD; --help tells more\",\"exitCode\":2}", 2},
+    {"RefusedByTheClient", {"--json", "run", "Go", "a"}, R"({"error":"a parameter is written as NAME=VALUE, not as \"a\"","exitCode":2})", 2},
+    {"NoConnection", {"--json", "--port", "1", "info"}, R"({"error":"no connection to 127.0.0.1:1: Connection refused","exitCode":3})", 3},
+};
+// clang-format on
+
+INSTANTIATE_TEST_SUITE_P(Table, ProgramJson, testing::ValuesIn(jsonFailureCases),
+                         [](const auto& test) { return test.param.Name; });
+
+TEST(ProgramJson, TellsNoticesAndWarningsAsObjectsToo)
+{
+    VScriptedHost host([](VPeer& peer) {
+        peer.ReadFrame();
+        peer.SendFrame(ServerInformationText());
+        peer.SendFrame(EventText("A"));
+        peer.ReadToEnd();
+    });
+    EXPECT_EQ("{\"notice\":\"watching 127.0.0.1:" + std::to_string(host.Port()) + "\"}\n",
+              RunProgram(At(host, {"--json", "watch", "--count", "1"})).Errors);
+
+    VScriptedHost other([](VPeer& peer) {
+        peer.ReadFrame();
+        peer.SendFrame("<Events/>");
+        peer.ReadToEnd();
+    });
+    EXPECT_EQ("{\"warning\":\"attributes are not looked at\"}\n",
+              RunProgram(At(other, {"--json", "raw", "--lint"}), "<Events a='1'/>").Errors);
+}
+
+TEST(ProgramOptions, NumbersAreDecimalWithZerosBefore)
+{
+    VScriptedHost host([](VPeer& peer) {
+        peer.ReadFrame();
+        peer.SendFrame(ServerInformationText());
+        peer.ReadToEnd();
+    });
+
+    EXPECT_EQ(0, RunProgram({"--port", "0" + std::to_string(host.Port()), "info"}).ExitCode);
+}
 
 TEST(ProgramOptions, HelpListsCommandsAndExitCodes)
 {
@@ -291,13 +361,16 @@ TEST(ProgramFailure, OutputThatCannotBeWrittenIsOne)
         peer.SendFrame(ServerInformationText());
         peer.ReadToEnd();
     });
-    const std::string command = std::string(KORVA_CONTROL_PROGRAM) + " --port " +
-                                std::to_string(host.Port()) + " info >/dev/full 2>/dev/null";
+    const std::string program = std::string(KORVA_CONTROL_PROGRAM) + " --port " +
+                                std::to_string(host.Port()) + " --timeout 60 ";
+    for (const char* const words : {"info", "serve --listen 0", "--help", "--version"}) {
+        const std::string command = program + words + " >/dev/full 2>/dev/null";
 
-    const int status = std::system(command.c_str()); // NOLINT: a shell, to have the redirection
+        const int status = std::system(command.c_str()); // NOLINT: a shell, to have the redirection
 
-    ASSERT_TRUE(WIFEXITED(status));
-    EXPECT_EQ(1, WEXITSTATUS(status));
+        ASSERT_TRUE(WIFEXITED(status));
+        EXPECT_EQ(1, WEXITSTATUS(status)) << words;
+    }
 }
 
 TEST(ProgramFailure, ClosedOutputIsNeverTakenForTheConnection)

@@ -261,6 +261,9 @@ TEST_F(Shell, SpeaksJsonAlsoOfItself)
     ASSERT_EQ(2U, objects.size()) << outcome.Output;
     EXPECT_EQ("quit", objects[0]["help"].back()["usage"]);
     EXPECT_TRUE(objects[1].contains("connected"));
+    EXPECT_THAT(outcome.Errors,
+                HasSubstr(R"({"error":"\"nonsense\" cannot be done so; help lists what can"})"
+                          "\n"));
 }
 
 TEST_F(Shell, EndsWhereItsInputWasClosed)
