@@ -11,7 +11,8 @@ an escaped one would be another name.
 
 from __future__ import annotations
 
-from typing import Iterable, Mapping, Tuple, Union
+import re
+from typing import Iterable, Mapping, Pattern, Tuple, Union
 
 from .errors import UsageError
 from .xmltext import encode_value
@@ -20,29 +21,32 @@ Parameters = Union[Mapping[str, str], Iterable[Tuple[str, str]]]
 """Names with values. Of two with one name the host would take the later; the lint refuses them."""
 
 _WHITE_SPACE = " \t\n\r"
-_LINE_CHARACTERS = "\t\n\r"
+_UNSENDABLE = re.compile("[\x00-\x1f\x7f\ud800-\udfff]")
+_UNSENDABLE_IN_LINES = re.compile("[\x00-\x08\x0b\x0c\x0e-\x1f\x7f\ud800-\udfff]")
 
 
-def _refuse_unsendable(text: str, what: str, allowed_controls: str) -> None:
+def _refuse_unsendable(text: str, what: str, unsendable: Pattern[str]) -> None:
     if not isinstance(text, str):
         raise UsageError(f"{what} is {type(text).__name__}, not text")
-    for character in text:
-        if (character < " " or character == "\x7f") and character not in allowed_controls:
-            raise UsageError(f"{what} holds the control character U+{ord(character):04X}")
-        if "\ud800" <= character <= "\udfff":
-            raise UsageError(f"{what} holds half of a surrogate pair, which is no character")
+    found = unsendable.search(text)
+    if found is None:
+        return
+    if found.group() >= "\ud800":
+        raise UsageError(f"{what} holds half of a surrogate pair, which is no character")
+    raise UsageError(f"{what} holds the control character U+{ord(found.group()):04X}")
 
 
 def check_verbatim(text: str, what: str) -> None:
     """Checks a text that the host takes as it stands, and cannot do without."""
-    _refuse_unsendable(text, what, _LINE_CHARACTERS)  # told below, where white space is all it has
+    # White space alone is told below, in better words.
+    _refuse_unsendable(text, what, _UNSENDABLE_IN_LINES)
     if not text:
         raise UsageError(f"{what} is empty, and the host answers nothing to that")
     if not text.strip(_WHITE_SPACE):
         raise UsageError(
             f"{what} is white space alone, which the host takes for empty and does not answer"
         )
-    _refuse_unsendable(text, what, "")
+    _refuse_unsendable(text, what, _UNSENDABLE)
     if "<" in text:
         raise UsageError(
             f'{what} holds "<", which the host can read in the value of a parameter only'
@@ -50,7 +54,7 @@ def check_verbatim(text: str, what: str) -> None:
 
 
 def check_value(text: str, what: str) -> None:
-    _refuse_unsendable(text, what, _LINE_CHARACTERS)
+    _refuse_unsendable(text, what, _UNSENDABLE_IN_LINES)
     if text and not text.strip(_WHITE_SPACE):
         raise UsageError(f"{what} is white space alone, which would reach the host as an empty one")
 
