@@ -115,7 +115,9 @@ void VConfigurationReader::ReadItem(INode& node)
               Item.Name, Proposed.Name, Verified.Name, VElementPath(itemPath));
     }
 
-    // What the store refuses, such as a value of another type than the item has, is left as it is.
+    // Deliberate: what the store refuses, which is a value of another type than the item has, is
+    // left out without a message. Older preference files hold a text where the item is a bool by
+    // now, and whoever loads them reads that text afterwards.
     const VDataToken token(itemPath);
     if (hasProposed) {
         if (!ConvertValue(node, itemPath, Proposed, proposed, value)) {

@@ -314,7 +314,7 @@ TEST(ReadConfiguration, TextBehindAValueIsAccepted)
     EXPECT_EQ(Verified(reader, "A.B"), 7);
 }
 
-TEST(ReadConfiguration, AValueOfAnotherTypeIsLeftOutWithoutAMessage)
+TEST(ReadConfiguration, AValueOfAnotherTypeIsLeftOutWithoutAMessageIsKept)
 {
     VDataStore store;
     {
