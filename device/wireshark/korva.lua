@@ -39,7 +39,9 @@ local failure = ProtoExpert.new("korva.failure", "The command failed",
     expert.group.RESPONSE_CODE, expert.severity.NOTE)
 local unreadable = ProtoExpert.new("korva.unreadable", "The text cannot be read as a message",
     expert.group.MALFORMED, expert.severity.ERROR)
-korva.experts = { silent, failure, unreadable }
+local not_captured = ProtoExpert.new("korva.not_captured", "The capture lacks a part of this message",
+    expert.group.UNDECODED, expert.severity.NOTE)
+korva.experts = { silent, failure, unreadable, not_captured }
 
 korva.prefs.port = Pref.uint("TCP port", 803, "The port on which the host listens")
 
@@ -125,31 +127,63 @@ local function piece(message, first, last)
         value = decode(readable(range:raw())), range = range }
 end
 
--- Finds <name>content</name> or <name/> between two positions. What a host writes is never nested in
--- an element of the same name, so that the next end tag is its own.
-local function element(message, name, first, last)
-    local text = message.text
-    local opened = "<" .. name
-    local begin = text:find(opened, first, true)
-    while begin and begin <= last do
-        local after = text:sub(begin + #opened, begin + #opened)
-        if after == ">" or after == "/" or after:match("^%s$") then
-            local tag_end = text:find(">", begin, true)
-            if not tag_end then
-                return nil
-            end
-            if text:sub(tag_end - 1, tag_end - 1) == "/" then
-                return piece(message, tag_end, tag_end - 1), tag_end + 1
-            end
-            local close = text:find("</" .. name .. ">", tag_end + 1, true)
-            if not close then
-                return nil
-            end
-            return piece(message, tag_end + 1, close - 1), close + #name + 3
+-- Where a piece of markup that is no element ends: a declaration, a comment and their like.
+local function special_end(text, begin)
+    for start, stop in pairs({ ["<!--"] = "-->", ["<?"] = "?>", ["<![CDATA["] = "]]>" }) do
+        if text:sub(begin, begin + #start - 1) == start then
+            local _, last = text:find(stop, begin + #start, true)
+            return last
         end
-        begin = text:find(opened, begin + 1, true)
     end
-    return nil
+    return text:sub(begin, begin + 1) == "<!" and text:find(">", begin, true) or nil
+end
+
+-- Visits the elements that lie between two positions, but not what lies in them: visit(name, first,
+-- last) gets the positions of the content, and ends it all by returning true. What a host writes is
+-- never nested in an element of the same name, so that the next end tag is its own. Returns where
+-- the reading ended.
+local function each_child(message, first, last, visit)
+    local text, position = message.text, first
+    while position <= last do
+        local begin = text:find("<", position, true)
+        if not begin or begin > last then
+            return position
+        end
+        local name, tag_end = text:match("^<([^%s/>?!<]+)[^<>]*()>", begin)
+        local special = not name and special_end(text, begin)
+        if special then
+            position = special + 1
+        elseif not name or tag_end > last then
+            return position
+        elseif text:sub(tag_end - 1, tag_end - 1) == "/" then
+            position = tag_end + 1
+            if visit(name, position, tag_end) then
+                return position
+            end
+        else
+            local close, close_end = text:find("</" .. name .. ">", tag_end + 1, true)
+            if not close or close_end > last then
+                return position
+            end
+            position = close_end + 1
+            if visit(name, tag_end + 1, close - 1) then
+                return position
+            end
+        end
+    end
+    return position
+end
+
+-- The first element of a name that lies directly between two positions, or nil.
+local function element(message, name, first, last)
+    local found
+    each_child(message, first, last, function(child, from, to)
+        if child == name then
+            found = piece(message, from, to)
+        end
+        return found
+    end)
+    return found
 end
 
 local function add(tree, field, found)
@@ -163,15 +197,11 @@ local function add(tree, field, found)
 end
 
 local function each(message, name, first, last, visit)
-    local position = first
-    while position <= last do
-        local found, after = element(message, name, position, last)
-        if not found then
-            return
+    each_child(message, first, last, function(child, from, to)
+        if child == name then
+            visit(piece(message, from, to))
         end
-        visit(found)
-        position = after
-    end
+    end)
 end
 
 local function add_parameters(message, tree, list, description)
@@ -204,11 +234,13 @@ local function silence_of(message)
         if empty("Name") then return "it has no Name" end
         if empty("Correlation") then return "it has no Correlation" end
         local list = element(message, "Parameters", message.first, message.last)
-        local nameless = false
+        local nameless, begun = false, false
         if root == "ExecuteCommand" and list then
-            each(message, "Parameter", list.first, list.last, function(parameter)
-                local name = element(message, "Name", parameter.first, parameter.last)
-                nameless = nameless or not name or not name.text:find("%S")
+            each_child(message, list.first, list.last, function(child, from, to)
+                begun = begun or child == "Parameter" -- and so is whatever follows
+                local name = begun and element(message, "Name", from, to)
+                nameless = begun and (not name or not name.text:find("%S"))
+                return nameless
             end)
         end
         return nameless and "a parameter has no Name" or nil
@@ -223,30 +255,32 @@ local function silence_of(message)
     return "it is none of the six requests"
 end
 
+-- What a host looks for in a message, in this order.
+local request_roots = { "ExecuteCommand", "ServerInformation", "Commands", "CommandInformation",
+    "EventInformation", "Events" }
+
 -- Finds the element that tells what the message is. The list of commands has its correlation before
 -- it, as an element of its own.
 local function find_root(message)
-    local text = message.text
-    local position = text:match("^%s*<%?.-%?>()") or 1
-    message.top = position
-    if text:find("^%s*<Correlation[ >/]", position) then
-        local _, after = element(message, "Correlation", position, #text)
-        position = after or position
+    local roots = {}
+    local rest = each_child(message, 1, #message.text, function(name, first, last)
+        roots[#roots + 1] = name
+        roots[name] = roots[name] or { first = first, last = last }
+    end)
+    message.correlation = roots.Correlation
+    if message.text:find("^%s*[^%s<]") or message.text:find("%S", rest) then
+        return false -- there is something outside of the elements
     end
-    local root, tag_end = text:match("^%s*<(%a[%w.]*)[^>]*()>", position)
-    if not root then
+    message.root = roots[1] == "Correlation" and roots[2] or roots[1]
+    for index = #request_roots, 1, -1 do
+        if is_request(message) and roots[request_roots[index]] then
+            message.root = request_roots[index]
+        end
+    end
+    if not message.root then
         return false
     end
-    message.root = root
-    if text:sub(tag_end - 1, tag_end - 1) == "/" then
-        message.first, message.last = tag_end + 1, tag_end
-        return true
-    end
-    local close = text:find("</" .. root .. ">", tag_end + 1, true)
-    if not close then
-        return false
-    end
-    message.first, message.last = tag_end + 1, close - 1
+    message.first, message.last = roots[message.root].first, roots[message.root].last
     return true
 end
 
@@ -331,7 +365,10 @@ local function add_content(message, tree, pinfo)
     end
     add(tree, f.name, name)
     words[#words + 1] = name and name.value or nil
-    local correlation = element(message, "Correlation", message.top, #message.text)
+    local correlation = element(message, "Correlation", message.first, message.last)
+    if not correlation and message.correlation and not is_request(message) then
+        correlation = piece(message, message.correlation.first, message.correlation.last)
+    end
     if add(tree, f.correlation, correlation) then
         words[#words + 1] = "#" .. cut(correlation.value)
         link(message, tree, pinfo, correlation.text)
@@ -358,34 +395,52 @@ local function add_content(message, tree, pinfo)
     return table.concat(words, " ")
 end
 
-local function dissect_message(tvb, pinfo, tree)
+local function add_message(message, branch, pinfo)
+    branch:add(f.message, message.root)
+    branch:add(f.kind, kind_of(message))
+    local summary = add_content(message, branch, pinfo)
+    local reason = is_request(message) and silence_of(message)
+    if reason then
+        branch:add_proto_expert_info(silent, "The host answers nothing: " .. reason)
+    end
+    return summary
+end
+
+-- Shows a frame, of which a capture with a limit may hold the first bytes only. Returns a summary.
+local function add_frame(tvb, pinfo, branch)
+    if tvb:len() < header_size then
+        branch:add_proto_expert_info(not_captured)
+        return "(not captured)"
+    end
     local length = tvb(0, header_size):le_uint()
-    local branch = tree:add(korva, tvb())
+    local captured = math.min(length, tvb:len() - header_size)
     branch:add_le(f.length, tvb(0, header_size))
     local message = { to_host = pinfo.dst_port == korva.prefs.port, text = "" }
-    if length > 0 then
-        message.range = tvb(header_size, length)
-        message.text = message.range:raw()
-        branch:add(f.text, message.range, readable(message.text))
+    if captured > 0 then
+        message.range = tvb(header_size, captured)
+        local bytes = message.range:raw()
+        message.text = bytes:match("^[^\0]*") -- a host reads no further than to a zero
+        branch:add(f.text, message.range, readable(bytes))
     end
-    local summary
-    if length > 0 and find_root(message) then
-        branch:add(f.message, message.root)
-        branch:add(f.kind, kind_of(message))
-        summary = add_content(message, branch, pinfo)
-        local reason = is_request(message) and silence_of(message)
-        if reason then
-            branch:add_proto_expert_info(silent, "The host answers nothing: " .. reason)
-        end
-    else
-        summary = length == 0 and "(empty)" or "(unreadable)"
-        branch:add_proto_expert_info(unreadable)
+    if captured < length then
+        branch:add_proto_expert_info(not_captured)
+        return "(not captured)"
     end
-    branch:append_text(": " .. cut(summary))
+    if find_root(message) then
+        return add_message(message, branch, pinfo)
+    end
+    branch:add_proto_expert_info(unreadable)
+    return length == 0 and "(empty)" or "(unreadable)"
+end
+
+local function dissect_message(tvb, pinfo, tree)
+    local branch = tree:add(korva, tvb())
+    local summary = cut(add_frame(tvb, pinfo, branch))
+    branch:append_text(": " .. summary)
     if messages_in_packet > 0 then
-        pinfo.cols.info:append(" | " .. cut(summary))
+        pinfo.cols.info:append(" | " .. summary)
     else
-        pinfo.cols.info = cut(summary)
+        pinfo.cols.info = summary
     end
     messages_in_packet = messages_in_packet + 1
     return tvb:len()
@@ -395,6 +450,9 @@ end
 local largest = 0x7FFFFFFF
 
 local function frame_size(tvb, _, offset)
+    if tvb:len() < offset + header_size then
+        return tvb:reported_length_remaining(offset) -- the capture lacks the header
+    end
     return math.min(header_size + tvb(offset, header_size):le_uint(), largest)
 end
 

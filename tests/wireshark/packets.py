@@ -26,8 +26,11 @@ def packet(ports: Tuple[int, int], sequence: int, acknowledged: int, data: bytes
     return header + tcp + data
 
 
-def capture(payloads: Sequence[Payload]) -> bytes:
-    """The content of a capture file. Long data are cut into packets."""
+def capture(payloads: Sequence[Payload], limit: int = 1 << 18) -> bytes:
+    """The content of a capture file. Long data are cut into packets.
+
+    @param limit: how many bytes of a packet are captured
+    """
     link_type_raw_ip = 101
     result = struct.pack("<IHHiIII", 0xA1B2C3D4, 2, 4, 0, 0, 1 << 18, link_type_raw_ip)
     sent = {TO_HOST: 1, TO_DEVICE: 1}
@@ -36,7 +39,8 @@ def capture(payloads: Sequence[Payload]) -> bytes:
         for begin in range(0, max(len(data), 1), 30000):
             part = data[begin : begin + 30000]
             bytes_ = packet(ports, sent[ports], sent[ports[::-1]], part)
-            result += struct.pack("<IIII", seconds, 0, len(bytes_), len(bytes_)) + bytes_
+            kept = bytes_[:limit]
+            result += struct.pack("<IIII", seconds, 0, len(kept), len(bytes_)) + kept
             sent[ports] += len(part)
             seconds += 1
     return result

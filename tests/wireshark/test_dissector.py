@@ -294,6 +294,62 @@ class Hostile(Case):
             rows = self.dissect([(ports, frame(text)) for text in texts], "korva.length")
             self.assertEqual([str(len(text)) for text in texts], [row[0] for row in rows])
 
+    def test_a_capture_with_a_limit_lacks_the_end_of_its_packets(self) -> None:
+        data = frame(b"<Commands><Correlation>1</Correlation></Commands>")
+        for kept in (0, 1, 3, 4, 5, len(data) - 1):
+            content = capture([(TO_HOST, data), (TO_HOST, frame(b"<Events/>"))], limit=40 + kept)
+            (self.folder / "cut.pcap").write_bytes(content)
+            rows = self.fields("cut.pcap", "_ws.expert.message", show="tcp.seq == 1")
+            told = "The capture lacks a part of this message"
+            self.assertEqual([[told if kept else ""]], rows)
+
+    def test_the_name_of_a_parameter_is_not_that_of_the_command(self) -> None:
+        listed = (
+            b"<Parameters><Parameter><Name>Inner</Name><Value>1</Value></Parameter></Parameters>"
+        )
+        rows = self.dissect(
+            [
+                (TO_HOST, frame(b"<ExecuteCommand>" + listed + content + b"</ExecuteCommand>"))
+                for content in (
+                    b"<Name>Outer</Name><Correlation>1</Correlation>",
+                    b"<Correlation>1</Correlation>",
+                )
+            ],
+            "korva.name",
+            "_ws.expert.message",
+        )
+        self.assertEqual([["Outer", ""], ["", "The host answers nothing: it has no Name"]], rows)
+
+    def test_what_stands_around_the_message_is_read_as_a_host_does(self) -> None:
+        answered = [
+            b"<!-- <Novelty> --><Events/>",
+            b"<Novelty/><Events/>",
+            b"<Events/>\0what follows is not looked at",
+            b" \n<Events>\n</Events>\n",
+        ]
+        rows = self.dissect(
+            [(TO_HOST, frame(text)) for text in answered], "korva.message", "_ws.expert.message"
+        )
+        self.assertEqual([["Events", ""]] * len(answered), rows)
+
+        novel = [b"<a_b></a_b>", "<Größe/>".encode()]
+        rows = self.dissect([(TO_HOST, frame(text)) for text in novel])
+        self.assertEqual([["a_b"], ["Größe"]], rows)
+
+        unreadable = [b"x<Events/>", b"<Events/>x", b"<Events/></Events>"]
+        rows = self.dissect([(TO_HOST, frame(text)) for text in unreadable])
+        self.assertEqual([[""]] * len(unreadable), rows)
+
+    def test_everything_behind_the_first_parameter_is_one(self) -> None:
+        request = (
+            b"<ExecuteCommand><Name>A</Name><Correlation>1</Correlation><Parameters><Parameter>"
+            b"<Name>p</Name></Parameter><Novelty/></Parameters></ExecuteCommand>"
+        )
+        self.assertEqual(
+            [["The host answers nothing: a parameter has no Name"]],
+            self.dissect([(TO_HOST, frame(request))], "_ws.expert.message"),
+        )
+
     def test_entities_are_decoded_once_and_bad_bytes_are_shown(self) -> None:
         event = b"<Event><Name>a&amp;lt;b\xffc</Name><Parameters/></Event>"
         self.assertEqual(
