@@ -26,6 +26,20 @@ ODDITIES: List[Oddity] = [
         ],
     ),
     Oddity(
+        "One request of a frame is answered",
+        "Of several at the top of one frame the host takes one, and the others are lost: the first "
+        "that is whole in the order `ExecuteCommand`, `ServerInformation`, `Commands`, "
+        "`CommandInformation`, `EventInformation`, `Events`. Other elements beside it are passed "
+        "over.",
+        "Devices send one request a frame, so that nobody misses the others.",
+        [
+            (
+                "<Novelty/><Commands/><EventInformation>Event.Disconnect</EventInformation><Events/>",
+                "<EventInformation><Name/><Description/><Parameters/></EventInformation>",
+            )
+        ],
+    ),
+    Oddity(
         "The declaration says UTF-16",
         'Every message of the host says `encoding="UTF-16"`, and its bytes are UTF-8. Decode the '
         "bytes as UTF-8 first, and keep your XML reader from looking at the declaration: cut it "
@@ -48,7 +62,7 @@ ODDITIES: List[Oddity] = [
         "Entities are decoded in the values of parameters only",
         "`Name` and `Correlation` are taken as they stand. Written as `a&amp;b`, a correlation is "
         "seven characters, and comes back encoded once more. So use letters and digits. In a "
-        "value the five entities are decoded, `&amp;` last.",
+        "value the five entities are decoded, `&amp;` last, and references by number are not.",
         "Devices compare what comes back with what they know to come back.",
         [
             (
@@ -58,6 +72,10 @@ ODDITIES: List[Oddity] = [
             (
                 execute("Host.Echo", ("Text", "&lt;&amp;lt;&quot;")),
                 reply("Host.Echo", ("Text", "&lt;&amp;lt;&quot;")),
+            ),
+            (
+                execute("Host.Echo", ("Text", "&#233;")),
+                reply("Host.Echo", ("Text", "&amp;#233;")),
             ),
         ],
     ),
@@ -86,6 +104,12 @@ ODDITIES: List[Oddity] = [
             (
                 execute("Host.Echo", ("B", "1"), ("A", "2"), ("B", "3")),
                 reply("Host.Echo", ("A", "2"), ("B", "3")),
+            ),
+            (
+                "<ExecuteCommand><Name>Host.Echo</Name><Correlation>7</Correlation><Parameters>"
+                "<Parameter><Name>A</Name><Value>1</Value></Parameter>"
+                "<Novelty><Name>B</Name></Novelty></Parameters></ExecuteCommand>",
+                reply("Host.Echo", ("A", "1"), ("B", "")),
             ),
             (execute("Host.Echo", ("A", "1"), ("", "2")), SILENCE),
         ],
