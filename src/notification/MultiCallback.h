@@ -26,7 +26,7 @@ class VMultiCallbackPostal;
 ///
 /// Threads: every operation [any]. The mutex guards the list only: functions are called, copied and
 /// destroyed without it, since each of these may come back here. A call runs the list as it stood
-/// when the call began.
+/// when the call began, also to its end where one of its functions destroys this object.
 /// Failure: an exception of a function passes to whoever called, and those after it do not run.
 template <typename R, typename... Args>
 class VMultiCallback<R(Args...)> : public KVR::IMultiCallback<R(Args...)>
@@ -37,6 +37,13 @@ public:
     VMultiCallback() = default;
     VMultiCallback(const VMultiCallback&) = delete;
     VMultiCallback& operator=(const VMultiCallback&) = delete;
+
+    ~VMultiCallback() override
+    {
+        for (const VEntry& entry : entries) {
+            entry->InList = false;
+        }
+    }
 
     std::uint64_t Add(boost::function<Sig> function) override
     {
@@ -60,14 +67,16 @@ public:
             return false; // most lists of most objects are empty: that costs no lock
         }
         const VSnapshot called = Entries(); // keeps the handles of removed ones unused
-        std::vector<std::uint64_t> dead;
+        std::vector<VEntry> dead;
         for (const VEntry& entry : called) {
             if (!KVR::GuardedCall(*entry, arguments...)) {
-                dead.push_back(HandleOf(entry));
+                dead.push_back(entry);
             }
         }
-        for (const std::uint64_t handle : dead) {
-            Remove(handle);
+        for (const VEntry& entry : dead) {
+            if (entry->InList) { // else there may be no list any more
+                Remove(HandleOf(entry));
+            }
         }
         return dead.size() < called.size();
     }
@@ -75,7 +84,14 @@ public:
 private:
     friend class VMultiCallbackPostal<Sig>;
 
-    typedef boost::function<Sig> VStored;
+    /// A function, which a running call keeps although its list may be gone.
+    struct VStored : boost::function<Sig>
+    {
+        explicit VStored(boost::function<Sig> added) : boost::function<Sig>(std::move(added)) {}
+
+        std::atomic<bool> InList{true}; // false once the list is destroyed
+    };
+
     typedef std::shared_ptr<VStored> VEntry;
     typedef boost::container::small_vector<VEntry, 4> VSnapshot; // most lists are short
 

@@ -10,6 +10,7 @@
 #include <stdexcept>
 #include <string>
 #include <thread>
+#include <utility>
 #include <vector>
 
 using NotificationSystem::VMultiCallback;
@@ -218,6 +219,38 @@ TEST_F(MultiCallback, OnlyDeadTargetsMakeTheResultFalse)
 
     EXPECT_FALSE(callback());
     EXPECT_EQ(0u, callback.Count());
+}
+
+TEST_F(MultiCallback, AFunctionMayDestroyItsListBesideDeadTargets)
+{
+    auto list = std::make_unique<VMultiCallback<void()>>();
+    list->Add([] { throw KVR::VDeregisterWeakCallbackException(); });
+    list->Add([&] { list.reset(); });
+    list->Add([] { throw KVR::VDeregisterWeakCallbackException(); });
+    list->Add([this] { called += 'z'; });
+
+    VMultiCallback<void()>& calling = *list;
+
+    EXPECT_TRUE(calling());
+    EXPECT_EQ(called, "z");
+}
+
+TEST_F(MultiCallback, AFunctionMayDestroyItsListWithinACallOfACall)
+{
+    auto list = std::make_unique<VMultiCallback<void()>>();
+    bool inner = false;
+    list->Add([] { throw KVR::VDeregisterWeakCallbackException(); });
+    list->Add([&] {
+        if (!std::exchange(inner, true)) {
+            (*list)();
+            return;
+        }
+        list.reset();
+    });
+
+    VMultiCallback<void()>& calling = *list;
+
+    EXPECT_TRUE(calling());
 }
 
 TEST_F(MultiCallback, RemovingADeadEntryNeverHitsANewOne)
