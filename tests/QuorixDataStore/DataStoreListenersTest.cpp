@@ -297,6 +297,68 @@ TEST_F(DataStoreListeners, ListenersNestByPlainRecursion)
     EXPECT_EQ((Texts{"A begins", "B", "A ends", "A any"}), order);
 }
 
+TEST_F(DataStoreListeners, ALaterCommitsListenersMayRunBeforeAnEarlierOnesAreThrough)
+{
+    Texts order;
+    VWorkerThread other;
+    {
+        VDataWriter writer(store);
+        writer.GetListeners(VDataPath("A")).OnVerifiedChanged.Add([&] {
+            order.push_back("A begins");
+            other.Do([this] { Set("B", Byte(1)); }); // would hang if anything were locked here
+            order.push_back("A ends");
+        });
+        writer.GetListeners(VDataPath("B")).OnAnyChange.Add([&] { order.push_back("B"); });
+    }
+
+    Set("A", Byte(1));
+
+    EXPECT_EQ((Texts{"A begins", "B", "A ends"}), order);
+    EXPECT_EQ(3u, VDataReader(store).GetCurrentChangeId());
+}
+
+TEST_F(DataStoreListeners, ListenerThatWritesToAStoreThatItsThreadReadsIsFatal)
+{
+    VDataStore listening;
+    {
+        VDataWriter writer(listening);
+        writer.GetListeners(VDataPath("A")).OnVerifiedChanged.Add([this] {
+            VDataWriter inner(store);
+        });
+    }
+    VAssertions assertions(VAssertions::Return);
+    const VDataReader outer(store);
+    {
+        VDataWriter writer(listening);
+        writer.SetValue(Token("A"), Byte(1));
+    }
+
+    EXPECT_EQ((Texts{"Fatal attempt to acquire a write lock from within a read lock."}),
+              assertions.Expressions());
+    EXPECT_EQ(0u, outer.GetCurrentChangeId());
+}
+
+TEST_F(DataStoreListeners, MadeForAPathWhileACommitFiresHearOfTheNext)
+{
+    Texts heard;
+    {
+        VDataWriter writer(store);
+        writer.GetListeners(VDataPath("A.B")).OnVerifiedChanged.Add([&] {
+            VDataWriter inner(store);
+            inner.GetListeners(VDataPath("A.*")).OnVerifiedChanged.Add([&] {
+                heard.push_back("A.*");
+            });
+            heard.push_back("A.B");
+        });
+    }
+
+    Set("A.B", Byte(1));
+    EXPECT_EQ((Texts{"A.B"}), heard);
+
+    Set("A.C", Byte(1));
+    EXPECT_EQ((Texts{"A.B", "A.*"}), heard);
+}
+
 TEST_F(DataStoreListeners, ThrowingListenerIsLoggedAndTheOthersStillFire)
 {
     Listen("A");
