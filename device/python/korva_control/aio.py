@@ -405,8 +405,9 @@ class AsyncClient:
         """Asks to be let in, and waits for the operator where he is asked.
 
         Look at the status of what is returned; "Connected" means to try again later. An operator
-        who closes the dialog gives no answer at all, and TimedOutError tells so; the request is
-        then taken back. Once authorized, the client sends its heartbeat by itself, and asks anew
+        who closes the dialog gives no answer at all, and TimedOutError tells so after
+        `operator_time_limit` seconds; the request is then taken back, as it is where the waiting is
+        cancelled. Once authorized, the client sends its heartbeat by itself, and asks anew
         after each reconnection.
         """
         return await self._authorizer.authorize(
