@@ -172,6 +172,9 @@ private:
                 return 1;
             case EShellInput::Posted:
                 ShowPosted();
+                if (VShellInput::HasTyped()) {
+                    return ReadTyped(character); // though more is posted all the time
+                }
                 break;
             case EShellInput::Resized:
                 el_resize(editor);
@@ -209,7 +212,7 @@ private:
     void ShowPosted()
     {
         HideLine();
-        input.Inbox().RunAll();
+        input.Inbox().RunSome();
         std::fflush(stdout);
         el_wset(editor, EL_REFRESH);
     }
@@ -293,6 +296,11 @@ VLineEditor::VLineEditor(VShellInput& shellInput, const std::string& historyFile
 
 VLineEditor::~VLineEditor() = default;
 
+bool VLineEditor::IsAtTerminal() const
+{
+    return terminal != nullptr;
+}
+
 std::optional<std::string> VLineEditor::ReadLine()
 {
     return terminal ? terminal->ReadLine() : ReadPlainLine();
@@ -304,7 +312,7 @@ std::optional<std::string> VLineEditor::ReadPlainLine()
     for (;;) {
         switch (input.Wait(true)) {
         case EShellInput::Posted:
-            input.Inbox().RunAll();
+            input.Inbox().RunSome();
             break;
         case EShellInput::Ready: {
             char byte = 0;

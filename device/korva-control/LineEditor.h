@@ -26,6 +26,9 @@ public:
     VLineEditor(const VLineEditor&) = delete;
     VLineEditor& operator=(const VLineEditor&) = delete;
 
+    /// Whether there is a person to type.
+    bool IsAtTerminal() const;
+
     /// Returns the next line without its end; empty at the end of the input, and after SIGTERM.
     std::optional<std::string> ReadLine();
 

@@ -54,8 +54,24 @@ VShell::VShell(const VShellOptions& shellOptions, VOutput& shellOutput)
              [this](const Words& words) { return names.Complete(words); }),
       client(ClientOptions(options.Client))
 {
+    if (editor.IsAtTerminal()) {
+        LimitEvents();
+    }
     client.AddEventHandler(
-        "", [this](const VEvent& event) { inbox.Post([this, event] { OnEvent(event); }); });
+        "", [this](const VEvent& event) { inbox.PostEvent([this, event] { OnEvent(event); }); });
+}
+
+/// A terminal may be slower than a host, and whoever types there must not wait for all that it
+/// said.
+void VShell::LimitEvents()
+{
+    constexpr std::size_t waitingLimit = 1000;
+    inbox.LimitEvents(waitingLimit, [this](std::size_t leftOut) {
+        if (showsEvents) {
+            Print(EColour::Notice,
+                  "-- the terminal is too slow; events left out: " + std::to_string(leftOut));
+        }
+    });
 }
 
 void VShell::Run()
@@ -325,7 +341,7 @@ TResult VShell::Await(const TStart& start)
     while (!*result) {
         switch (input.Wait(false)) {
         case EShellInput::Posted:
-            inbox.RunAll();
+            inbox.RunSome();
             break;
         case EShellInput::Interrupted:
         case EShellInput::Terminated:

@@ -45,6 +45,7 @@ private:
     void PrintHelp();
     void PrintInfo();
     void PrintReply(const std::string& name, const ControlStream::VCommandReply& reply);
+    void LimitEvents();
     void OnEvent(const ControlStream::VEvent& event);
     void OnStatus(const ControlStream::VAsyncStatus& status);
     void LoadNames();

@@ -50,6 +50,12 @@ EShellInput VShellInput::Wait(bool reads)
     }
 }
 
+bool VShellInput::HasTyped()
+{
+    pollfd descriptor{STDIN_FILENO, POLLIN, 0};
+    return poll(&descriptor, 1, 0) > 0;
+}
+
 bool VShellInput::ReadByte(char& byte)
 {
     ssize_t count = 0;

@@ -26,6 +26,9 @@ public:
     /// @param reads  whether typed text counts; it stays where it is otherwise
     EShellInput Wait(bool reads);
 
+    /// Whether something typed can be taken at once.
+    static bool HasTyped();
+
     /// Takes one byte that has been typed. @return false at the end of the input
     static bool ReadByte(char& byte);
 
