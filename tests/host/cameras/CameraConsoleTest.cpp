@@ -2,7 +2,9 @@
 #include "CameraCommands.h"
 #include "Console.h"
 #include "DebugServices/ThreadName.h"
+#include "QuorixDataStore/DataReader.h"
 #include "QuorixDataStore/DataWriter.h"
+#include "io/Values.h"
 
 #include <gmock/gmock.h>
 #include <nlohmann/json.hpp>
@@ -31,6 +33,19 @@ protected:
         const VCameraServices services = {store, hardware, cameras, selection};
         AddCameraCommands(console, services);
         AddCameraState(console, services);
+    }
+
+    /// Waits until a thread of that name is in the answer to `locks`, and returns it.
+    std::string AwaitInLocks(const std::string& thread)
+    {
+        std::string locks;
+        const auto deadline = std::chrono::steady_clock::now() + CameraTest::limit;
+        while (locks.find(thread) == std::string::npos &&
+               std::chrono::steady_clock::now() < deadline) {
+            std::this_thread::yield();
+            locks = console.Answer("locks");
+        }
+        return locks;
     }
 
     const std::shared_ptr<VCameraSelection> selection = std::make_shared<VCameraSelection>();
@@ -264,13 +279,7 @@ TEST_F(CameraConsole, LocksTellsWhoHoldsAndWhoWaits)
         DebugServices::SetThreadName("Waiter");
         const VDataWriter writer(*store);
     });
-    std::string locks;
-    const auto deadline = std::chrono::steady_clock::now() + CameraTest::limit;
-    while (locks.find("Waiter") == std::string::npos &&
-           std::chrono::steady_clock::now() < deadline) {
-        std::this_thread::yield();
-        locks = console.Answer("locks");
-    }
+    const std::string locks = AwaitInLocks("Waiter");
     release.CountUp();
     holder.join();
     waiter.join();
@@ -282,5 +291,63 @@ TEST_F(CameraConsole, LocksTellsWhoHoldsAndWhoWaits)
     EXPECT_EQ("ok [" + lock("Holder", changeId, "false") + "," +
                   lock("Waiter", changeId + 1, "true") + "]",
               locks);
+    EXPECT_EQ("ok []", console.Answer("locks"));
+}
+
+TEST_F(CameraConsole, StateAndLocksAreToldFromWithinNestedViewsWhileAWriterWaits)
+{
+    std::thread waiter;
+    std::string state;
+    std::string locks;
+    {
+        VDataWriter writer(*store);
+        writer.SetValue(VDataToken(VDataPath{"Control", "a", "Name"}), MakeStringValue("pending"));
+        const VDataReader reader(*store);
+        waiter = std::thread([&] {
+            DebugServices::SetThreadName("Waiter");
+            const VDataWriter queued(*store);
+        });
+        AwaitInLocks("Waiter");
+        state = console.Answer("state");
+        locks = console.Answer("locks");
+    }
+    waiter.join();
+
+    const nlohmann::json told = nlohmann::json::parse(state.substr(3));
+    EXPECT_EQ(4U, told["cameras"].size());
+    EXPECT_EQ(R"({"a":{"Connected":false,"Name":"pending"}})", told["control"].dump());
+    const nlohmann::json holders = nlohmann::json::parse(locks.substr(3));
+    ASSERT_EQ(2U, holders.size());
+    EXPECT_EQ(1, holders[0]["readLocks"]);
+    EXPECT_EQ(1, holders[0]["writeLocks"]);
+    EXPECT_EQ(false, holders[0]["waiting"]);
+    EXPECT_EQ(true, holders[1]["waiting"]);
+    EXPECT_EQ(holders[0]["changeId"].get<int>() + 1, holders[1]["changeId"].get<int>());
+    EXPECT_EQ("ok []", console.Answer("locks"));
+}
+
+TEST_F(CameraConsole, StateIsToldWhileAReaderPutsOffACommitAndAWriterWaits)
+{
+    std::thread waiter;
+    std::string state;
+    {
+        const VDataReader reader(*store);
+        std::thread([&] {
+            DebugServices::SetThreadName("Gone");
+            VDataWriter writer(*store);
+            writer.RemoveAll(VDataPath("Device.*"));
+        }).join();
+        waiter = std::thread([&] {
+            DebugServices::SetThreadName("Waiter");
+            const VDataWriter queued(*store);
+        });
+        AwaitInLocks("Waiter");
+        state = console.Answer("state");
+        EXPECT_NE(std::string::npos, console.Answer("locks").find("(a thread that has ended)"));
+    }
+    waiter.join();
+
+    const nlohmann::json told = nlohmann::json::parse(state.substr(3));
+    EXPECT_EQ("Camera 1", told["cameras"][0]["Name"]);
     EXPECT_EQ("ok []", console.Answer("locks"));
 }
