@@ -1,3 +1,4 @@
+#include "korva-control/ShellInbox.h"
 #include "korva-control/ShellNames.h"
 #include "korva-control/ShellWords.h"
 
@@ -6,6 +7,8 @@
 #include <gmock/gmock.h>
 
 #include <functional>
+
+#include <poll.h>
 
 namespace {
 
@@ -138,6 +141,49 @@ TEST(ShellNamesStart, EndsWithAWholeCharacter)
     EXPECT_EQ("a", VShellNames::CommonStart({{"a\u00E9", true}, {"a\u00E8", true}}));
     EXPECT_EQ("", VShellNames::CommonStart({{"\U0001F600", true}, {"\U0001F601", true}}));
     EXPECT_EQ("\u00E9", VShellNames::CommonStart({{"\u00E9", true}, {"\u00E9x", true}}));
+}
+
+bool IsReadable(int descriptor)
+{
+    pollfd readable{descriptor, POLLIN, 0};
+    return poll(&readable, 1, 0) > 0;
+}
+
+TEST(ShellInbox, RunsAPartAtOnceAndKeepsTellingOfTheRest)
+{
+    VShellInbox inbox;
+    int runs = 0;
+    for (int i = 0; i < 150; ++i) {
+        inbox.Post([&runs, i] { EXPECT_EQ(i, runs++); });
+    }
+
+    inbox.RunSome();
+    EXPECT_EQ(100, runs);
+    EXPECT_TRUE(IsReadable(inbox.Descriptor()));
+    inbox.RunSome();
+
+    EXPECT_EQ(150, runs);
+    EXPECT_FALSE(IsReadable(inbox.Descriptor()));
+}
+
+TEST(ShellInbox, LeavesEventsOutFromItsLimitOnUntilAllHaveRun)
+{
+    VShellInbox inbox;
+    std::vector<std::string> done;
+    inbox.LimitEvents(101, [&](std::size_t leftOut) { done.push_back(std::to_string(leftOut)); });
+    for (int i = 0; i < 103; ++i) {
+        inbox.PostEvent([&] { done.emplace_back("event"); });
+    }
+    inbox.Post([&] { done.emplace_back("other"); });
+
+    inbox.RunSome();
+    inbox.PostEvent([&] { done.emplace_back("event"); });
+    inbox.RunSome();
+    inbox.PostEvent([&] { done.emplace_back("event"); });
+    inbox.RunSome();
+
+    done.erase(done.begin(), done.begin() + 100);
+    EXPECT_THAT(done, ElementsAre("event", "other", "3", "event"));
 }
 
 } // namespace
