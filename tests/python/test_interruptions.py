@@ -2,7 +2,7 @@
 
 import asyncio
 import struct
-from typing import List
+from typing import Callable, List
 
 from client_case import ClientCase
 from korva_control import (
@@ -39,9 +39,11 @@ def answer_all(peer: Peer) -> None:
 
 
 class Connecting(ClientCase):
-    async def connect_to(self, *scripts: object, reconnect: bool = False) -> None:
+    async def connect_to(
+        self, *scripts: Callable[[Peer], None], reconnect: bool = False
+    ) -> None:
         self.pauses = Pauses()
-        self.host = ScriptedHost(*scripts)  # type: ignore[arg-type]
+        self.host = ScriptedHost(*scripts)
         self.client = AsyncClient(
             ClientOptions(
                 time_limit=LIMIT,
