@@ -189,6 +189,8 @@ TEST(AsyncClient, SaysWhatItWaitedForWithoutAHost)
                        "sent for the reply to the command \"Go\""}),
               ErrorOf(client.ExecuteCommand("Go")));
     EXPECT_FALSE(client.WaitUntilConnected(Hasty));
+    ASSERT_TRUE(
+        client.WaitFor([](const VAsyncStatus& status) { return !status.Reason.empty(); }, Patient));
     EXPECT_THAT(client.GetStatus().Reason, HasSubstr("no connection to 127.0.0.1:1"));
 }
 

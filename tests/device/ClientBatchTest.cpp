@@ -115,17 +115,18 @@ TEST(ClientBatch, ReadsWhileItWritesAndKeepsLittleUnanswered)
 
 TEST(ClientBatch, GoesOnBehindACommandThatIsNeverAnswered)
 {
+    constexpr std::chrono::milliseconds unhurried{1500}; // the other reply has to come within it
     VScriptedHost host([&](VPeer& peer) {
         peer.ReadFrame();
         peer.SendFrame(ReplyText(CorrelationOf(peer.ReadFrame())));
         peer.ReadToEnd();
     });
-    VClient client(WithLimit(Hasty));
+    VClient client(WithLimit(unhurried));
     client.Connect("127.0.0.1", host.Port());
 
     const auto outcomes = client.ExecuteBatch({{"Never", {}}, {"Go", {}}});
 
-    EXPECT_EQ("timed out after 0.03 s, waiting for the reply to the command \"Never\"",
+    EXPECT_EQ("timed out after 1.5 s, waiting for the reply to the command \"Never\"",
               ErrorOf(outcomes[0]));
     EXPECT_EQ("a reply", ErrorOf(outcomes[1]));
     EXPECT_TRUE(client.IsConnected());

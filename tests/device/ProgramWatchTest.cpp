@@ -147,7 +147,7 @@ TEST(ProgramWatch, GoesOnWithoutLimitWhereNoTimeIsGivenAndStopsAtOneThatIs)
     VScriptedHost host(Watched([](VPeer& peer) { peer.SendFrame(EventText("A", "1")); }));
 
     const VOutcome outcome =
-        RunProgram({"--port", std::to_string(host.Port()), "--timeout", "0.3", "watch"});
+        RunProgram({"--port", std::to_string(host.Port()), "--timeout", "1.5", "watch"});
 
     EXPECT_EQ(4, outcome.ExitCode);
     EXPECT_EQ("A p=1\n", outcome.Output);
